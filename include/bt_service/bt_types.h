@@ -42,13 +42,16 @@
 #endif
 
 /* Layout assertions. In C++ a record that crosses a process boundary must also be free of padding. */
-#if defined(__cplusplus)
+#if defined(__cplusplus) && __cplusplus >= 201703L
 #define BT_ASSERT(condition, name) static_assert(condition, #name)
 #define BT_ASSERT_SIZE(type, bytes)                                                                        \
     static_assert(sizeof(type) == (bytes), #type " has another size");                                     \
     static_assert(std::is_trivially_copyable<type>::value && std::is_standard_layout<type>::value &&       \
                       std::has_unique_object_representations<type>::value,                                 \
                   #type " is not a plain record without padding")
+#elif defined(__cplusplus)
+#define BT_ASSERT(condition, name) static_assert(condition, #name)
+#define BT_ASSERT_SIZE(type, bytes) static_assert(sizeof(type) == (bytes), #type " has another size")
 #elif defined(__STDC_VERSION__) && __STDC_VERSION__ >= 201112L
 #define BT_ASSERT(condition, name) _Static_assert(condition, #name)
 #define BT_ASSERT_SIZE(type, bytes) _Static_assert(sizeof(type) == (bytes), #type " has another size")
