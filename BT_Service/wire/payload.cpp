@@ -47,10 +47,21 @@ Payload& Payload::be32(uint32_t value)
     return be16(value >> 16).be16(value);
 }
 
+Payload& Payload::le16(uint32_t value)
+{
+    return u8(value).u8(value >> 8);
+}
+
 Payload& Payload::zeros(uint32_t length)
 {
     append(length);
     return *this;
+}
+
+Payload& Payload::zeros_to(uint32_t size)
+{
+    // The difference of a longer payload wraps to a length that cannot fit.
+    return zeros(size - size_);
 }
 
 Payload& Payload::bytes(const void* source, uint32_t length)

@@ -15,7 +15,10 @@ public:
     Payload& i32(int32_t value);
     Payload& be16(uint32_t value);
     Payload& be32(uint32_t value);
+    Payload& le16(uint32_t value);
     Payload& zeros(uint32_t length);
+    // Appends zeros until the payload has `size` bytes; a payload that is longer already is refused.
+    Payload& zeros_to(uint32_t size);
     Payload& bytes(const void* source, uint32_t length);
     // As bytes(), but a null source stands for that many zero bytes.
     Payload& bytes_or_zeros(const void* source, uint32_t length);

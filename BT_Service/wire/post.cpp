@@ -13,4 +13,10 @@ int32_t post(BtProcessNumber channel, Request request, Payload& payload)
     return sent == -1 ? BT_NOT_POSTED : sent;
 }
 
+int32_t post(BtProcessNumber channel, Request request)
+{
+    Payload nothing;
+    return post(channel, request, nothing);
+}
+
 } // namespace bt
