@@ -148,17 +148,47 @@ void reset()
     s.deepest = s.stray = 0;
 }
 
-const std::vector<Post>& posts() { return state().posts; }
-const std::vector<LogRecord>& logs() { return state().logs; }
-const std::vector<TimerCall>& timers() { return state().timers; }
-const std::vector<std::string>& calls() { return state().calls; }
-const std::vector<uint32_t>& sizes_asked() { return state().sizes_asked; }
+const std::vector<Post>& posts()
+{
+    return state().posts;
+}
+const std::vector<LogRecord>& logs()
+{
+    return state().logs;
+}
+const std::vector<TimerCall>& timers()
+{
+    return state().timers;
+}
+const std::vector<std::string>& calls()
+{
+    return state().calls;
+}
+const std::vector<uint32_t>& sizes_asked()
+{
+    return state().sizes_asked;
+}
 
-void set_pno(uint32_t pno) { state().pno = pno; }
-void answer_send(int32_t result) { state().send_answer = result; }
-void answer_timer(int32_t result) { state().timer_answer = result; }
-void incoming(const Bytes& message) { state().incoming.push_back(message); }
-void answer_receive(int32_t result) { state().receive_answer = result; }
+void set_pno(uint32_t pno)
+{
+    state().pno = pno;
+}
+void answer_send(int32_t result)
+{
+    state().send_answer = result;
+}
+void answer_timer(int32_t result)
+{
+    state().timer_answer = result;
+}
+void incoming(const Bytes& message)
+{
+    state().incoming.push_back(message);
+}
+void answer_receive(int32_t result)
+{
+    state().receive_answer = result;
+}
 
 void fail_nth(uint32_t n)
 {
@@ -172,8 +202,14 @@ void fail_from(uint32_t n)
     state().counted = 0;
 }
 
-void fail_only(const char* call) { state().fail_only = call; }
-uint32_t counted_calls() { return state().counted; }
+void fail_only(const char* call)
+{
+    state().fail_only = call;
+}
+uint32_t counted_calls()
+{
+    return state().counted;
+}
 
 uint8_t* area(const std::string& name, uint32_t size, uint8_t fill)
 {
@@ -189,8 +225,14 @@ uint8_t* find_area(const std::string& name)
     return found == state().areas.end() ? nullptr : found->second.at;
 }
 
-void remove_area(const std::string& name) { state().areas.erase(name); }
-void report_size(const std::string& name, uint32_t size) { state().areas[name].reported = size; }
+void remove_area(const std::string& name)
+{
+    state().areas.erase(name);
+}
+void report_size(const std::string& name, uint32_t size)
+{
+    state().areas[name].reported = size;
+}
 
 uint8_t* guarded(uint32_t size, uint8_t fill)
 {
@@ -205,8 +247,14 @@ uint32_t held_locks()
     return static_cast<uint32_t>(std::count_if(locks.begin(), locks.end(), [](const Lock& lock) { return lock.held; }));
 }
 
-uint32_t deepest_lock() { return state().deepest; }
-uint32_t stray_unlocks() { return state().stray; }
+uint32_t deepest_lock()
+{
+    return state().deepest;
+}
+uint32_t stray_unlocks()
+{
+    return state().stray;
+}
 
 uint32_t lock_handle(const std::string& name)
 {
@@ -264,7 +312,10 @@ std::optional<Bytes> read_file(const std::string& unit_path)
     return Bytes(std::istreambuf_iterator<char>(file), std::istreambuf_iterator<char>());
 }
 
-void remove_file(const std::string& unit_path) { std::filesystem::remove_all(root() + unit_path); }
+void remove_file(const std::string& unit_path)
+{
+    std::filesystem::remove_all(root() + unit_path);
+}
 
 Bytes hex(const std::string& text)
 {
@@ -318,7 +369,10 @@ int32_t _sys_RcvMsg(uint32_t own_pno, uint32_t size, void* buffer, uint32_t)
     return 1;
 }
 
-uint32_t _sys_GetPno() { return state().pno; }
+uint32_t _sys_GetPno()
+{
+    return state().pno;
+}
 
 void _sys_Exit(int32_t code)
 {

@@ -50,10 +50,10 @@ const std::vector<uint32_t>& sizes_asked(); // size word of each LinkShareData o
 
 // ---- how it answers
 void set_pno(uint32_t pno);
-void answer_send(int32_t result);     // of every following _sys_SndMsg; default 0
-void answer_timer(int32_t result);    // of both timer calls; default 0
-void incoming(const Bytes& message);  // queued for _sys_RcvMsg, which answers 1
-void answer_receive(int32_t result);  // of _sys_RcvMsg when nothing is queued; default 0
+void answer_send(int32_t result); // of every following _sys_SndMsg; default 0
+void answer_timer(int32_t result); // of both timer calls; default 0
+void incoming(const Bytes& message); // queued for _sys_RcvMsg, which answers 1
+void answer_receive(int32_t result); // of _sys_RcvMsg when nothing is queued; default 0
 
 // Every call of _sys_SndMsg, _sys_RcvMsg, _sys_CreateSemaphore, _sys_SemLock, _sys_SemUnlock, _sys_LinkShareData,
 // _sys_ReqTimerStart, _sys_TimerStop counts, the first being 1. A failing call returns kSendFailure and so on.
@@ -69,7 +69,7 @@ enum : int32_t { kSendFailure = -1, kLockFailure = 51, kUnlockFailure = 52, kLin
 // faults. The same name again replaces it.
 uint8_t* area(const std::string& name, uint32_t size, uint8_t fill = 0);
 uint8_t* find_area(const std::string& name); // null when there is none
-void remove_area(const std::string& name);   // linking it fails from now on
+void remove_area(const std::string& name); // linking it fails from now on
 void report_size(const std::string& name, uint32_t size); // what the size word of a link answers instead
 
 // Memory of `size` bytes between two unreadable pages, ending right at the second; for the caller's buffers.
@@ -77,9 +77,9 @@ void report_size(const std::string& name, uint32_t size); // what the size word 
 uint8_t* guarded(uint32_t size, uint8_t fill = 0xA5);
 
 // ---- locks
-uint32_t held_locks();         // locks held now
-uint32_t deepest_lock();       // most locks held at once since reset
-uint32_t stray_unlocks();      // unlocks of a lock that was not held
+uint32_t held_locks(); // locks held now
+uint32_t deepest_lock(); // most locks held at once since reset
+uint32_t stray_unlocks(); // unlocks of a lock that was not held
 uint32_t lock_handle(const std::string& name); // 0 when never created
 
 // ---- process
