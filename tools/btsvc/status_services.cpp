@@ -1,0 +1,51 @@
+// The unit's services, as its supervisor tells them.
+#include "btsvc/shared_copy.h"
+#include "btsvc/status.h"
+#include "btsvc/table.h"
+#include "btsvc/unit.h"
+#include "catalogue/print.h"
+#include "sim/unit_records.h"
+
+#include <fmt/format.h>
+
+#include <algorithm>
+#include <iterator>
+
+namespace bt::client {
+namespace {
+
+using Json = nlohmann::ordered_json;
+
+} // namespace
+
+std::string report_services(Output& output)
+{
+    const auto unit = shared_copy<BtSimUnit>(kUnitDataName);
+    const std::string root = unit ? bounded_text(unit->root) : "";
+
+    if (output.json())
+        output.object({{"type", "unit"},
+                       {"domain", bt_host_domain()},
+                       {"supervisor_pid", unit ? Json(unit->supervisor_pid) : Json()},
+                       {"root", root}});
+    else
+        output.line(fmt::format(
+            "Domain \"{}\"{}", bt_host_domain(),
+            unit ? fmt::format(": unit of process {}, root {}", unit->supervisor_pid, catalogue::printable(root))
+                 : ""));
+    if (!unit) return root;
+
+    Table table("service", {{"pno", "number"}, {"name", "service"}, {"pid", "process"}, {"starts", "starts"}});
+    const size_t count = std::min<size_t>(unit->service_count, std::size(unit->services));
+    for (size_t i = 0; i < count; ++i) {
+        const BtSimService& service = unit->services[i];
+        table.add({{"pno", catalogue::id_text(service.pno)},
+                   {"name", bounded_text(service.name)},
+                   {"pid", service.pid == 0 ? Json() : Json(service.pid)},
+                   {"starts", service.starts}});
+    }
+    table.print(output, "\nServices", "none");
+    return root;
+}
+
+} // namespace bt::client
