@@ -4,10 +4,14 @@
  *
  * Everything lives in a domain, a name taken from BT_PLATFORM_DOMAIN ("default" when unset; 1..32 characters of
  * A-Z a-z 0-9 _ -). Processes of two domains never see each other. A domain exists from bt_host_create_domain() until
- * bt_host_remove_domain(); without it every post fails with -1.
+ * bt_host_remove_domain(); without it every post fails with -1. A process reads the name when it first needs the domain,
+ * and again after that domain was removed.
  *
  * Functions return 0 (or a count) on success and a negative value on failure; bt_host_error() then says what went
- * wrong, where, and how to mend it.
+ * wrong, where, and how to mend it. All of them may be called by any number of threads at once.
+ *
+ * A child made by fork() keeps what its parent linked and the handles of its locks. It owns no process number, and runs
+ * no timers; it may claim a number of its own.
  */
 #ifndef BT_PLATFORM_HOST_H
 #define BT_PLATFORM_HOST_H
@@ -22,19 +26,32 @@ enum {
     BT_HOST_ANY_PNO = 0,             /**< for bt_host_claim_pno(): any free number of the range below */
     BT_HOST_FIRST_FREE_PNO = 0x4000,
     BT_HOST_LAST_FREE_PNO = 0x7FFF,
-    BT_HOST_NAME_MAX = 64            /**< longest name of shared data and locks, terminating zero included */
+    BT_HOST_NAME_MAX = 64,           /**< longest name of shared data and locks, terminating zero included */
+    BT_HOST_TIMER_MAX = 64           /**< timers of a process that run at the same time */
 };
 
-/** Name of the domain in force. */
+/** Name of the domain in force; valid until the domain changes. */
 BT_PLATFORM_API const char *bt_host_domain(void);
 
 /** What the last failed call of this thread has to say; empty when none failed. Also set by failing _sys_ calls. */
 BT_PLATFORM_API const char *bt_host_error(void);
 
-/** Creates the domain. @return 0 created; 1 it existed already; -1 failure */
+/**
+ * Creates the domain. Processes may do so at the same time: one gets 0, the others 1.
+ *
+ * Takes up to half a second when the process that was creating it died.
+ *
+ * @return 0 created; 1 it existed already; -1 failure
+ */
 BT_PLATFORM_API int32_t bt_host_create_domain(void);
 
-/** Removes the domain and every object in it. Processes that still use them keep their mappings. @return 0, -1 */
+/**
+ * Removes the domain and every object in it, also one that cannot be used any more.
+ *
+ * Processes that still use it keep their mappings; their posts and receives return -1, waiting ones at once.
+ *
+ * @return 0 removed; -1 there is none, or it belongs to another user
+ */
 BT_PLATFORM_API int32_t bt_host_remove_domain(void);
 
 /**
@@ -42,12 +59,22 @@ BT_PLATFORM_API int32_t bt_host_remove_domain(void);
  * there from an owner that died are kept. A process owns one number at most; BT_PLATFORM_PNO in the environment gives
  * one to a program that does not call this.
  *
+ * The number ends with the process, also when it is killed, and with bt_host_release_pno(). After a kill its queue stays:
+ * posts are accepted until it is full, and the next owner finds them. BT_HOST_ANY_PNO gives the lowest number that no live
+ * process owns, with an empty queue.
+ *
  * @param pno  the number, or BT_HOST_ANY_PNO
- * @return 0 owned; 1 a live process owns it; -1 failure
+ * @return 0 owned, also when the process owned it already; 1 a live process owns it; -1 failure, also when the process
+ *         owns another number
  */
 BT_PLATFORM_API int32_t bt_host_claim_pno(uint32_t pno);
 
-/** Gives the number back and removes its queue: posts to it return 1 again. @return 0, -1 when none is owned */
+/**
+ * Gives the number back and drops its queue: posts to it return 1 again. Stops the process's timers, ends waiting receives
+ * with -1 and closes the descriptor of bt_host_receive_fd().
+ *
+ * @return 0; -1 when none is owned
+ */
 BT_PLATFORM_API int32_t bt_host_release_pno(void);
 
 /**
@@ -58,13 +85,26 @@ BT_PLATFORM_API int32_t bt_host_release_pno(void);
  */
 BT_PLATFORM_API int32_t bt_host_receive(void *buffer, uint32_t size, int32_t timeout_ms);
 
-/** A descriptor that polls readable while messages wait; owned by the layer. @return the descriptor, -1 */
+/**
+ * A descriptor that polls readable while messages wait, for programs with their own loop.
+ *
+ * The layer owns it: never read or close it. After it turned readable call bt_host_receive() with 0 until that returns 0;
+ * -1 then says that the domain was removed. A thread of the layer keeps it up from the first call on.
+ *
+ * @return the descriptor, the same for every call while the number is owned; -1 failure
+ */
 BT_PLATFORM_API int32_t bt_host_receive_fd(void);
 
-/** Creates zero-filled shared data. @return 0 created; 1 it exists with that size, content kept; -1 failure */
+/**
+ * Creates zero-filled shared data.
+ *
+ * @param name  1 to 63 characters of any kind
+ * @param size  bytes, not 0
+ * @return 0 created; 1 it exists with that size, content kept; -1 failure, also when it exists with another size
+ */
 BT_PLATFORM_API int32_t bt_host_create_data(const char *name, uint32_t size);
 
-/** Removes shared data. @return 0, -1 when there is none */
+/** Removes shared data. Links made before stay valid; the next link looks for it anew. @return 0, -1 when there is none */
 BT_PLATFORM_API int32_t bt_host_remove_data(const char *name);
 
 /** A process number and its queue. */
@@ -90,7 +130,7 @@ typedef struct {
     uint32_t size;
 } BtHostData;
 
-/** Lists what the domain holds, at most `maximum` records. @return number of records, -1 failure */
+/** Lists what the domain holds, at most `maximum` records. Changes nothing. @return number of records, -1 failure */
 BT_PLATFORM_API int32_t bt_host_list_queues(BtHostQueue *out, int32_t maximum);
 BT_PLATFORM_API int32_t bt_host_list_locks(BtHostLock *out, int32_t maximum);
 BT_PLATFORM_API int32_t bt_host_list_data(BtHostData *out, int32_t maximum);
