@@ -85,8 +85,9 @@ int32_t BT_SRV_HFP_sendDtmf(const BtHfpDtmf* dtmf)
     if (dtmf == nullptr) return BT_FAILED;
     const int32_t count = dtmf->count;
     if (count > static_cast<int32_t>(sizeof dtmf->characters)) return BT_FAILED;
-    for (int32_t i = 0; i < count; ++i)
+    for (int32_t i = 0; i < count; ++i) {
         if (!is_dtmf(dtmf->characters[i])) return BT_FAILED;
+    }
 
     return post(Request::HFP_sendDtmf, Payload().bytes(dtmf, sizeof *dtmf));
 }

@@ -4,7 +4,6 @@
 #include <bt_service/bt_hands_free.h>
 
 #include <algorithm>
-#include <cstring>
 #include <iterator>
 
 BtShareHandle g_bt_hfp_share = {};

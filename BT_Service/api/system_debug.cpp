@@ -38,8 +38,9 @@ constexpr size_t kExportPathSize = 254; // of a copied log, its closing zero inc
 
 void remove_switch_files()
 {
-    for (const SwitchFile& file : kSwitchFiles)
+    for (const SwitchFile& file : kSwitchFiles) {
         std::remove(RootedPath(file.path).c_str());
+    }
 }
 
 void write_switches(const SwitchFile& file, const uint32_t* switches)
@@ -47,8 +48,9 @@ void write_switches(const SwitchFile& file, const uint32_t* switches)
     std::FILE* const stream = std::fopen(RootedPath(file.path).c_str(), "a");
     if (stream == nullptr) return;
 
-    for (uint32_t i = 0; i < file.switches; ++i)
+    for (uint32_t i = 0; i < file.switches; ++i) {
         if (switches[file.first_switch + i] == 1) std::fprintf(stream, "%s=%s;\n", file.keys[i], "ON");
+    }
     std::fclose(stream);
 }
 
@@ -63,8 +65,9 @@ bool is_same_file(std::FILE* open, const char* path)
 void copy_bytes(std::FILE* source, std::FILE* destination)
 {
     char buffer[512];
-    while (const size_t length = std::fread(buffer, 1, sizeof buffer, source))
+    while (const size_t length = std::fread(buffer, 1, sizeof buffer, source)) {
         std::fwrite(buffer, 1, length, destination);
+    }
 }
 
 void copy_file(const char* from, const char* to)
@@ -103,8 +106,9 @@ int32_t BT_SRV_requestDebugEnable(const uint32_t* switches)
     if (switches == nullptr) return BT_FAILED;
 
     remove_switch_files();
-    for (const SwitchFile& file : kSwitchFiles)
+    for (const SwitchFile& file : kSwitchFiles) {
         write_switches(file, switches);
+    }
     return bt::post(PNO_BT_SYS, Request::requestDebugEnable);
 }
 
@@ -118,8 +122,9 @@ int32_t BT_SRV_requestDebugOutput(const char* directory)
 {
     if (!can_export_to(directory)) return BT_FAILED;
 
-    for (const char* const log : kLogFiles)
+    for (const char* const log : kLogFiles) {
         copy_log(directory, log);
+    }
     remove_switch_files();
     return BT_OK;
 }

@@ -27,7 +27,7 @@ typedef struct {
 BT_ASSERT_SIZE(BtConParameters, 28);
 BT_ASSERT_AT(BtConParameters, values, 4);
 
-/** The profiles to which an accepted connection is limited. */
+/** The profiles to which an accepted connection is limited; begins like a `BtConProfileFilter`. */
 typedef struct {
     int32_t count;             /*  0  entries in use; 0 or less: no filter            */
     uint32_t profiles[8];      /*  4  sent whole                                      */

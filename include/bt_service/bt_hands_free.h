@@ -5,12 +5,14 @@
  * Conventions of this header, in addition to those of bt_types.h:
  *
  *  1. Requests go to the hands-free service (PNO_BT_HFP). A request returns 0 when it is posted and -127 when the
- *     message layer is unusable; any other positive code is the platform's. A refused argument is -1 or -2, as each
- *     function says, and nothing is sent. The outcome arrives later as an event of the hands-free service.
+ *     message layer is unusable; any other code is what the platform's _sys_SndMsg() returned (1 nobody owns the
+ *     process number, 2 its queue is full). A refused argument is -1 or -2, as each function says, and nothing is sent.
+ *     The outcome arrives later as an event of the hands-free service.
  *  2. Queries copy out of the hands-free status area (`BtHfpStatusArea`), which the hands-free service keeps up to
- *     date. They return 0 after the copy and -1, with the output untouched, for a null output and while the area or
- *     its lock cannot be had, that is until the service has created them; calling again later is all it takes. The
- *     copy is made under the area's lock, so an output of several words is of one moment.
+ *     date. They return 0 after the copy and -1, with the output untouched, for a null output and while the area or its
+ *     lock cannot be had, that is until the service has created them; calling again later is all it takes. The copy is
+ *     made under the area's lock, so an output of several words is of one moment; a lock that is not had in time does
+ *     not stop the copy.
  *  3. What values other than the initial ones mean is the hands-free service's; they are carried as they are.
  */
 #ifndef BT_SERVICE_BT_HANDS_FREE_H
@@ -196,8 +198,13 @@ BT_API int32_t BT_SRV_HFP_cancelDtmf(void);
 
 /* ---- requests: audio and phone */
 
-/** Answers the service's question about an audio connection. @return 0 posted; -127 not posted. Request 0x2001, 4
- *  payload bytes: value. */
+/**
+ * Answers the service's question about an audio connection.
+ *
+ * @return 0 posted; -127 not posted
+ *
+ * Request 0x2001, 4 payload bytes: value.
+ */
 BT_API int32_t BT_SRV_HFP_responceSCOConnection(uint32_t value);
 
 /**
@@ -219,11 +226,22 @@ BT_API int32_t BT_SRV_HFP_switchAudioLink(uint32_t value);
  */
 BT_API int32_t BT_SRV_HFP_setRemoteVolume(const BtHfpVolume *volume);
 
-/** Sets codec values. @return 0 posted; -2 null record; -127 not posted. Request 0x2105, 57 payload bytes: the record. */
+/**
+ * Sets codec values.
+ *
+ * @return 0 posted; -2 null record; -127 not posted
+ *
+ * Request 0x2105, 57 payload bytes: the record.
+ */
 BT_API int32_t BT_SRV_HFP_setCodecValue(const BtHfpCodec *codec);
 
-/** Sends an AT command. @return 0 posted; -1 null record; -127 not posted. Request 0x2003, 48 payload bytes: the
- *  record. */
+/**
+ * Sends an AT command.
+ *
+ * @return 0 posted; -1 null record; -127 not posted
+ *
+ * Request 0x2003, 48 payload bytes: the record.
+ */
 BT_API int32_t BT_SRV_HFP_sendATCommand(const BtHfpAtCommand *command);
 
 /**

@@ -6,8 +6,8 @@
  *
  *  1. Requests go to the object push service (PNO_BT_OPP), which serves object push, phonebook access and the OBEX
  *     sessions of both. A request returns 0 when it is posted; -1 when an argument is refused, and nothing is sent;
- *     -127 when the message layer is unusable; any other positive code is the platform's. The outcome arrives later
- *     as an event of the object push service.
+ *     -127 when the message layer is unusable; any other code is what the platform's _sys_SndMsg() returned (1 nobody
+ *     owns the process number, 2 its queue is full). The outcome arrives later as an event of the object push service.
  *  2. Functions whose name ends in Req take a length-prefixed record (`BtOppRecord`): two bytes with the number L of
  *     bytes that follow, then the body, which the service defines. Only L + 2 bytes need to exist, at any address. The
  *     payload is the record, length included. A null record and L above 1,006 are refused.
@@ -18,8 +18,8 @@
 #include <bt_service/bt_types.h>
 
 enum {
-    BT_OPP_BODY_MAX = 1006,    /* bytes of a record's body */
-    BT_OPP_SESSION_KEY_MAX = 20 /* bytes of a session key */
+    BT_OPP_BODY_MAX = 1006,        /* bytes of a record's body */
+    BT_OPP_SESSION_KEY_MAX = 20    /* bytes of a session key   */
 };
 
 /** A length-prefixed record of the largest size. */

@@ -6,8 +6,9 @@
  * Conventions of this header, in addition to those of bt_types.h:
  *
  *  1. Requests go to the system service (PNO_BT_SYS). A request returns 0 when it is posted; -1 when an argument is
- *     refused, and nothing is sent; -127 when the message layer is unusable; any other positive code is the platform's.
- *     The outcome arrives later as an event of the system service.
+ *     refused, and nothing is sent; -127 when the message layer is unusable; any other code is what the platform's
+ *     _sys_SndMsg() returned (1 nobody owns the process number, 2 its queue is full). The outcome arrives later as an
+ *     event of the system service.
  *  2. A name is a `BtSysName` of which only 4 + length bytes need to exist.
  *  3. The paths named here are moved below the folder that the environment variable BT_SERVICE_ROOT names, if it is
  *     set; the folder that a caller passes is used as it is.
@@ -18,11 +19,11 @@
 #include <bt_service/bt_types.h>
 
 enum {
-    BT_SYS_START_NAME_MAX = 248,     /* longest name that BT_SRV_initialize() takes                   */
-    BT_SYS_FTS_SNAPSHOT_MAX = 64,    /* bytes of an FTS log snapshot                                  */
-    BT_SYS_FTS_LOG_SIZE_MAX = 0x500000, /* largest FTS log                                            */
+    BT_SYS_START_NAME_MAX = 248,       /* longest name that BT_SRV_initialize() takes */
+    BT_SYS_FTS_SNAPSHOT_MAX = 64,      /* bytes of an FTS log snapshot                */
+    BT_SYS_FTS_LOG_SIZE_MAX = 5242880, /* bytes of the largest FTS log                */
     BT_SYS_EFFECTIVE_PROFILE_MAX = 255,
-    BT_SYS_SETUP_STATES = 9          /* words of g_setup_state                                        */
+    BT_SYS_SETUP_STATES = 9            /* words of g_setup_state                      */
 };
 
 /** What the service is started with; sent as it is. */
@@ -193,8 +194,13 @@ BT_API int32_t BT_SRV_setLocalDeviceDIDInfo(const BtSysDid *did, uint8_t value8,
  */
 BT_API int32_t BT_SRV_setEffectiveProfile(uint32_t value);
 
-/** Sets the device that carries the audio of calls. @return 0 posted; -1 null; -127 not posted. Request 0x110A, 8
- *  payload bytes. */
+/**
+ * Sets the device that carries the audio of calls.
+ *
+ * @return 0 posted; -1 null; -127 not posted
+ *
+ * Request 0x110A, 8 payload bytes.
+ */
 BT_API int32_t BT_SRV_setConnectSCODevice(const BtSysScoDevice *device);
 
 /**
@@ -221,8 +227,11 @@ BT_API int32_t BT_SRV_setHciMode(void);
 /** Sends a command to the controller; null sends 256 zero bytes. @return 0 posted; -127 not posted */
 BT_API int32_t BT_SRV_sendHciCommand(const BtSysHciCommand *command);
 
-/** Receive test: with mode 0 HCI Write Scan Enable (0x0C1A), else opcode 0xFD17.
- *  @return 0 posted; -1 null; -127 not posted */
+/**
+ * Receive test: with mode 0 HCI Write Scan Enable (0x0C1A), else opcode 0xFD17.
+ *
+ * @return 0 posted; -1 null; -127 not posted
+ */
 BT_API int32_t BT_SRV_testRxMode(const BtSysRxTest *test);
 
 /** Transmit test, opcode 0xFD85. @return 0 posted; -1 null or packet type above 11; -127 not posted */
