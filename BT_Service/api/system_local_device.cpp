@@ -1,7 +1,11 @@
 // What is known of the local device without asking the service.
 
-#include <bt_platform/platform.h>
+#include "api/linked_area.h"
+
 #include <bt_service/bt_system.h>
+
+#include <cstddef>
+#include <cstring>
 
 uint32_t g_setup_state[BT_SYS_SETUP_STATES] = {};
 
@@ -13,33 +17,27 @@ constexpr char kLocalDeviceArea[] = "/tmp/shm_sysmgr_local_devinfo";
 constexpr uint32_t kProfiles = 8;
 constexpr int32_t kNoSuchProfile = 2;
 
-const BtSysLocalDevice* link_local_device()
+// Copies `length` bytes at `offset` of the record, when all of the record is there.
+int32_t copy_out(void* out, uint32_t offset, uint32_t length)
 {
-    void* area = nullptr;
-    uint32_t size = sizeof(BtSysLocalDevice);
-    return _sys_LinkShareData(kLocalDeviceArea, &area, &size) == 0 ? static_cast<BtSysLocalDevice*>(area) : nullptr;
+    if (out == nullptr) return BT_FAILED;
+    const bt::LinkedArea area(kLocalDeviceArea, sizeof(BtSysLocalDevice), sizeof(BtSysLocalDevice));
+    if (!area.has(sizeof(BtSysLocalDevice))) return BT_FAILED;
+
+    std::memcpy(out, area.at(offset), length);
+    return BT_OK;
 }
 
 } // namespace
 
 int32_t BT_SRV_getLocalDeviceInformation(BtSysLocalDevice* out)
 {
-    if (out == nullptr) return BT_FAILED;
-    const BtSysLocalDevice* const device = link_local_device();
-    if (device == nullptr) return BT_FAILED;
-
-    *out = *device;
-    return BT_OK;
+    return copy_out(out, 0, sizeof *out);
 }
 
 int32_t BT_SRV_getLocalDeviceDIDInfo(BtSysDid* out)
 {
-    if (out == nullptr) return BT_FAILED;
-    const BtSysLocalDevice* const device = link_local_device();
-    if (device == nullptr) return BT_FAILED;
-
-    *out = device->did;
-    return BT_OK;
+    return copy_out(out, offsetof(BtSysLocalDevice, did), sizeof *out);
 }
 
 int32_t BT_SRV_getEffectiveProfileState(uint32_t index)
