@@ -21,8 +21,8 @@ BT_EXTERN_C_BEGIN
 
 /** A queued event; the head of a queue is one too. */
 typedef struct queue_node {
-    uint8_t slot[BT_MESSAGE_SIZE]; /*    0  a whole BtMessage                                        */
-    struct queue_node* link; /* 1024  the next event; in the head: null none, itself when empty */
+    uint8_t slot[BT_MESSAGE_SIZE]; /*    0  a whole BtMessage                                         */
+    struct queue_node* link;       /* 1024  the next event; in the head: null none, itself when empty */
 } BtQueueNode;
 BT_ASSERT_AT(BtQueueNode, slot, 0);
 BT_ASSERT_AT(BtQueueNode, link, 1024);

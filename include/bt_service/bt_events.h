@@ -19,13 +19,13 @@ enum { BT_EVT_LISTENERS_MAX = 50, BT_EVT_IDS_MAX = 35 };
 
 /** A listener. */
 typedef struct {
-    uint32_t handle; /*  0  handle of the registration; 0 marks a free entry   */
-    uint16_t pno; /*  4  process number of the listener                     */
-    uint16_t reserved; /*  6  zero                                               */
-    uint32_t tag; /*  8  as given at registration                           */
-    uint32_t active; /* 12  1 events are wanted, 0 suspended                   */
-    uint32_t event_count; /* 16  0..35                                              */
-    uint32_t event_ids[BT_EVT_IDS_MAX]; /* 20  the first event_count are valid                    */
+    uint32_t handle;                    /*  0  handle of the registration; 0 marks a free entry */
+    uint16_t pno;                       /*  4  process number of the listener                   */
+    uint16_t reserved;                  /*  6  zero                                             */
+    uint32_t tag;                       /*  8  as given at registration                         */
+    uint32_t active;                    /* 12  1 events are wanted, 0 suspended                 */
+    uint32_t event_count;               /* 16  0..35                                            */
+    uint32_t event_ids[BT_EVT_IDS_MAX]; /* 20  the first event_count are valid                  */
 } BtEvtListener;
 BT_ASSERT_SIZE(BtEvtListener, 160);
 BT_ASSERT_AT(BtEvtListener, handle, 0);
@@ -38,7 +38,7 @@ BT_ASSERT_AT(BtEvtListener, event_ids, 20);
 
 /** The shared data "/tmp/shm_eds_regist_table", under the lock "BT_SRV_EDS_SEM_NAME". */
 typedef struct {
-    uint32_t next_handle; /* 0  handle of the next registration; 0: not initialised */
+    uint32_t next_handle;                        /* 0  handle of the next registration; 0: not initialised */
     BtEvtListener entries[BT_EVT_LISTENERS_MAX]; /* 4                                                      */
 } BtEvtListenerTable;
 BT_ASSERT_SIZE(BtEvtListenerTable, 8004);

@@ -10,8 +10,8 @@
  * only read afterwards. The output functions and the dump may be called from any thread; a record is never mixed with
  * that of another thread.
  *
- * A log record is "2026/11/22 09:30:01.250 [CMN] message" with the local time; the newline is added when the format does
- * not end in one.
+ * A log record is "2026/11/22 09:30:01.250 [CMN] message" with the local time; the newline is added when the format
+ * does not end in one.
  */
 #ifndef BT_SERVICE_BT_LOG_H
 #define BT_SERVICE_BT_LOG_H
@@ -33,10 +33,10 @@ enum { BT_LOG_FIRST_NAMED_ZONE = 10, BT_LOG_ZONE_NAMES = 502, BT_LOG_ZONE_NAME_S
 
 /** The platform logger's parameter block: filled by the library, kept by the logger. */
 typedef struct {
-    uint8_t version; /*     0  2                                        */
-    char zone_names[BT_LOG_ZONE_NAMES][BT_LOG_ZONE_NAME_SIZE]; /*     1  first that of zone 10; zero-filled       */
-    uint8_t reserved[3]; /* 12049  zero                                     */
-    uint32_t enabled_zones[BT_LOG_ZONE_WORDS]; /* 12052  zone z is bit z % 32 of word z / 32      */
+    uint8_t version;                                           /*     0  2                                   */
+    char zone_names[BT_LOG_ZONE_NAMES][BT_LOG_ZONE_NAME_SIZE]; /*     1  first that of zone 10; zero-filled  */
+    uint8_t reserved[3];                                       /* 12049  zero                                */
+    uint32_t enabled_zones[BT_LOG_ZONE_WORDS];                 /* 12052  zone z is bit z % 32 of word z / 32 */
 } BtLogParameters;
 BT_ASSERT_SIZE(BtLogParameters, 12120);
 BT_ASSERT_AT(BtLogParameters, zone_names, 1);
@@ -44,13 +44,13 @@ BT_ASSERT_AT(BtLogParameters, reserved, 12049);
 BT_ASSERT_AT(BtLogParameters, enabled_zones, 12052);
 
 extern BT_API BT_CMN_logout BT_CMN_logout_wrapperFunc; /**< the output in force; the stub when loaded */
-extern BT_API uint8_t DebugConsoleLogSts; /**< 1: log to the console; 0 when loaded */
-extern BT_API uint8_t DebugFileOutLogSts; /**< 1: log to the file; 0 when loaded */
-extern BT_API uint8_t DebugSRVOutLogSts; /**< 1: message trace; 0 when loaded, 1 after each selection */
-extern BT_API int32_t DebugStrmLogStsOn; /**< 1: message trace in the stream process too */
-extern BT_API int32_t VEXLOG_Zone; /**< zone of the message trace; 28 when loaded */
-extern BT_API BtLogParameters g_VexLogParams; /**< read and kept by the platform logger */
-extern BT_API const char AppName[11]; /**< "BT_Service", the process name given to the logger */
+extern BT_API uint8_t DebugConsoleLogSts;              /**< 1: log to the console; 0 when loaded */
+extern BT_API uint8_t DebugFileOutLogSts;              /**< 1: log to the file; 0 when loaded */
+extern BT_API uint8_t DebugSRVOutLogSts;               /**< 1: message trace; 0 when loaded, 1 after each selection */
+extern BT_API int32_t DebugStrmLogStsOn;               /**< 1: message trace in the stream process too */
+extern BT_API int32_t VEXLOG_Zone;                     /**< zone of the message trace; 28 when loaded */
+extern BT_API BtLogParameters g_VexLogParams;          /**< read and kept by the platform logger */
+extern BT_API const char AppName[11];                  /**< "BT_Service", the process name given to the logger */
 
 /**
  * Selects the log output from the debug switch file; called once by a service process, before its threads log.

@@ -14,10 +14,10 @@ BT_EXTERN_C_BEGIN
 
 /** A shared memory object; the caller fills in name and size. W is the size of a pointer. */
 typedef struct shm_handle {
-    const char* name; /* 0      name of the object, beginning with "/"     */
-    uint32_t size; /* W      bytes of the object and of each mapping    */
-    int32_t fd; /* W + 4  descriptor, set by BT_CMN_createShm()      */
-    void* addr; /* W + 8  the mapping; null means not mapped         */
+    const char* name;          /* 0      name of the object, beginning with "/"  */
+    uint32_t size;             /* W      bytes of the object and of each mapping */
+    int32_t fd;                /* W + 4  descriptor, set by BT_CMN_createShm()   */
+    void* addr;                /* W + 8  the mapping; null means not mapped      */
 } BtShmHandle;
 BT_ASSERT_AT(BtShmHandle, size, sizeof(void*));
 BT_ASSERT_AT(BtShmHandle, fd, sizeof(void*) + 4);

@@ -22,10 +22,10 @@ enum { BT_TABLE_END = 0xFFFF };
 
 /** A state. The offsets are counted in words, the size of a pointer. */
 typedef struct state_table {
-    uint32_t state; /* 0  state id, or BT_TABLE_END                    */
-    void (*entry)(void); /* 1  run when the state is entered                */
-    void (*exit)(void); /* 2  run when the state is left                   */
-    const struct state_table* parent; /* 3  the state around this one; null for none     */
+    uint32_t state;                   /* 0  state id, or BT_TABLE_END                */
+    void (*entry)(void);              /* 1  run when the state is entered            */
+    void (*exit)(void);               /* 2  run when the state is left               */
+    const struct state_table* parent; /* 3  the state around this one; null for none */
 } BtStateRow;
 BT_ASSERT_AT(BtStateRow, entry, sizeof(void*));
 BT_ASSERT_AT(BtStateRow, exit, 2 * sizeof(void*));
@@ -36,26 +36,26 @@ typedef uint32_t (*BtAction)(void* message);
 
 /** What a machine does on an event in a state. */
 typedef struct mtx_table {
-    uint32_t state; /* 0  state id, or BT_TABLE_END                    */
-    uint32_t cid; /* 4  command or event id                          */
-    BtAction func; /* 8  run for this event in this state             */
+    uint32_t state;            /* 0  state id, or BT_TABLE_END        */
+    uint32_t cid;              /* 4  command or event id              */
+    BtAction func;             /* 8  run for this event in this state */
 } BtMatrixRow;
 BT_ASSERT_AT(BtMatrixRow, cid, 4);
 BT_ASSERT_AT(BtMatrixRow, func, 8);
 
 /** Which machine handles an event; an event with several rows drives several machines. */
 typedef struct dispatch_table {
-    uint32_t cid; /* 0  command or event id, or BT_TABLE_END         */
-    uint32_t func_id; /* 4  id of the machine                            */
+    uint32_t cid;              /* 0  command or event id, or BT_TABLE_END */
+    uint32_t func_id;          /* 4  id of the machine                    */
 } BtDispatchRow;
 BT_ASSERT_SIZE(BtDispatchRow, 8);
 BT_ASSERT_AT(BtDispatchRow, func_id, 4);
 
 /** A machine. The offsets are counted in words, the size of a pointer. */
 typedef struct func_id_table {
-    uint32_t func_id; /* 0  id of the machine, or BT_TABLE_END           */
-    uint32_t (*getstate)(void); /* 1  delivers the machine's current state         */
-    const struct mtx_table* mtx_table; /* 2  its matrix                                   */
+    uint32_t func_id;                  /* 0  id of the machine, or BT_TABLE_END   */
+    uint32_t (*getstate)(void);        /* 1  delivers the machine's current state */
+    const struct mtx_table* mtx_table; /* 2  its matrix                           */
 } BtFunctionIdRow;
 BT_ASSERT_AT(BtFunctionIdRow, getstate, sizeof(void*));
 BT_ASSERT_AT(BtFunctionIdRow, mtx_table, 2 * sizeof(void*));

@@ -4,8 +4,8 @@
  * requests to their responses.
  *
  * With the trace on (bt_log.h), every message sent, received or taken from an event queue leaves the line
- * "BTSRV A081 0102..." - id and at most 128 payload bytes in hex - at the platform logger, on the console and in the log
- * file, as far as each is switched on.
+ * "BTSRV A081 0102..." - id and at most 128 payload bytes in hex - at the platform logger, on the console and in the
+ * log file, as far as each is switched on.
  */
 #ifndef BT_SERVICE_BT_TRANSPORT_H
 #define BT_SERVICE_BT_TRANSPORT_H
@@ -17,9 +17,9 @@ BT_EXTERN_C_BEGIN
 
 /** A row of a request-response table; a row with BT_RESPONSE_END in both ids ends the table. */
 typedef struct {
-    uint16_t request; /*  0  id of the request               */
-    uint16_t response; /*  2  id of its response              */
-    uint16_t data_size; /*  4  payload bytes of the response   */
+    uint16_t request;          /*  0  id of the request             */
+    uint16_t response;         /*  2  id of its response            */
+    uint16_t data_size;        /*  4  payload bytes of the response */
 } BtResponseRow;
 BT_ASSERT_SIZE(BtResponseRow, 6);
 BT_ASSERT_AT(BtResponseRow, response, 2);
@@ -33,8 +33,8 @@ enum {
 /**
  * Sends a message to a process of the service.
  *
- * Posts header and payload, `len` + 16 bytes as a 16-bit sum and never more than 1,024, and traces the message. When the
- * platform's message layer is unusable the calling process ends with code -1.
+ * Posts header and payload, `len` + 16 bytes as a 16-bit sum and never more than 1,024, and traces the message. When
+ * the platform's message layer is unusable the calling process ends with code -1.
  *
  * @param file      caller's source file; not used
  * @param function  caller's name for the log

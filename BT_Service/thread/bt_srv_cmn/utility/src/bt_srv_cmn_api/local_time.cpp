@@ -2,10 +2,16 @@
 
 #include <bt_service/bt_log.h>
 
+#include <pthread.h>
 #include <sys/time.h>
 #include <time.h>
 
 namespace bt::cmn {
+namespace {
+
+pthread_once_t g_zone_read = PTHREAD_ONCE_INIT;
+
+} // namespace
 
 LocalTime local_time_now()
 {
@@ -13,7 +19,7 @@ LocalTime local_time_now()
     timeval now{};
     if (gettimeofday(&now, nullptr) != 0) return time;
 
-    tzset(); // localtime_r() need not follow a changed TZ by itself
+    pthread_once(&g_zone_read, tzset); // localtime_r() need not read TZ by itself
     time.known = localtime_r(&now.tv_sec, &time.calendar) != nullptr;
     time.milliseconds = static_cast<int>(now.tv_usec / 1000);
     return time;

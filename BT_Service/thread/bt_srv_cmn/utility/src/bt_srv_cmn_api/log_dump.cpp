@@ -28,7 +28,8 @@ DumpLine dump_line(const uint8_t* bytes, int32_t count)
     std::memset(line.text, ' ', kLineLength);
     line.text[kLineLength] = '\0';
     for (int32_t i = 0; i < count; ++i) {
-        put_hex(line.text + 2 + 5 * (i / 2) + 2 * (i % 2), bytes[i], kLowerDigits);
+        const int32_t hex_column = 2 + 5 * (i / 2) + 2 * (i % 2);
+        put_hex(&line.text[hex_column], bytes[i], kLowerDigits);
         const bool printable = bytes[i] >= 0x20 && bytes[i] <= 0x7E;
         line.text[44 + 9 * (i / 8) + i % 8] = printable ? static_cast<char>(bytes[i]) : '.';
     }
