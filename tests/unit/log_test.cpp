@@ -54,6 +54,8 @@ protected:
         fake::reset();
     }
 
+    void TearDown() override { select(""); }
+
     static std::string select(const std::string& switches)
     {
         fake::write_file(kMain, bytes_of(switches));
