@@ -30,7 +30,7 @@ void log_written(const char* function, const uint8_t* bytes, int count)
     CMN_LOG("[API][END] %s (%s)", function, text);
 }
 
-void write(const char* function, int line, uint32_t value, int width, Order order, uint8_t* output)
+void write_bytes(const char* function, int line, uint32_t value, int width, Order order, uint8_t* output)
 {
     CMN_LOG("[API][START] %s", function);
     if (output == nullptr) {
@@ -42,7 +42,7 @@ void write(const char* function, int line, uint32_t value, int width, Order orde
     log_written(function, output, width);
 }
 
-uint32_t read(const char* function, int line, const uint8_t* input, int width, Order order)
+uint32_t read_bytes(const char* function, int line, const uint8_t* input, int width, Order order)
 {
     CMN_LOG("[API][START] %s", function);
     uint32_t value = 0;
@@ -57,14 +57,14 @@ uint32_t read(const char* function, int line, const uint8_t* input, int width, O
 
 uint32_t read_long(const char* function, int line, const uint8_t* input, Order order)
 {
-    const uint32_t value = read(function, line, input, kLong, order);
+    const uint32_t value = read_bytes(function, line, input, kLong, order);
     CMN_LOG("[API][END] %s (0x%04x)", function, value);
     return value;
 }
 
 uint16_t read_short(const char* function, int line, const uint8_t* input, Order order)
 {
-    const auto value = static_cast<uint16_t>(read(function, line, input, kShort, order));
+    const auto value = static_cast<uint16_t>(read_bytes(function, line, input, kShort, order));
     CMN_LOG("[API][END] %s (0x%02x)", function, static_cast<unsigned>(value));
     return value;
 }
@@ -76,22 +76,22 @@ using namespace bt::cmn;
 
 void BT_CMN_LONG2BIG(uint32_t value, uint8_t* output)
 {
-    write(__func__, __LINE__, value, kLong, Order::kBig, output);
+    write_bytes(__func__, __LINE__, value, kLong, Order::kBig, output);
 }
 
 void BT_CMN_LONG2LITTLE(uint32_t value, uint8_t* output)
 {
-    write(__func__, __LINE__, value, kLong, Order::kLittle, output);
+    write_bytes(__func__, __LINE__, value, kLong, Order::kLittle, output);
 }
 
 void BT_CMN_SHORT2BIG(uint16_t value, uint8_t* output)
 {
-    write(__func__, __LINE__, value, kShort, Order::kBig, output);
+    write_bytes(__func__, __LINE__, value, kShort, Order::kBig, output);
 }
 
 void BT_CMN_SHORT2LITTLE(uint16_t value, uint8_t* output)
 {
-    write(__func__, __LINE__, value, kShort, Order::kLittle, output);
+    write_bytes(__func__, __LINE__, value, kShort, Order::kLittle, output);
 }
 
 uint32_t BT_CMN_BIG2LONG(const uint8_t* input)
