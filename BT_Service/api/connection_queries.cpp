@@ -75,7 +75,7 @@ int32_t BT_SRV_CON_getRemoteDeviceList(uint32_t, const int32_t* value, int32_t m
     AreaLock lock;
     if (lock.taken() != BT_OK) return 0;
     BtConRegDevListInfo list;
-    if (copy_field<kDevices>(list) != BT_OK || maximum < 0) return 0;
+    if (copy_held<kDevices>(list) != BT_OK || maximum < 0) return 0;
     return copy_devices(list, maximum, records);
 }
 

@@ -124,7 +124,8 @@ BT_API int32_t bt_con_writeFROM(void);
 BT_API int32_t bt_con_readFROM(void);
 
 /**
- * Resets the persistent part to the defaults, without taking the lock, and writes the image file.
+ * Resets the persistent part to the defaults, without taking the lock, and writes the image file. Meant for start-up:
+ * whoever reads or changes the area meanwhile may meet a mix of old and default bytes.
  *
  * @return 0; -1 not attached, or the defaults are in the area but not in the file
  */

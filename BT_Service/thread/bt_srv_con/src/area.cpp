@@ -4,7 +4,6 @@
 #include <bt_platform/platform.h>
 
 #include "thread/bt_srv_con/src/process_lock.h"
-#include "thread/bt_srv_con/src/shared_bytes.h"
 
 BtConShareHandle g_bt_con_share = {0, nullptr};
 
@@ -94,7 +93,7 @@ int32_t bt_con_getter(const void* field, void* buffer, uint32_t size, uint32_t l
     }
     AreaLock lock;
     if (lock.taken() != BT_OK) return lock.taken();
-    load(buffer, field, size);
+    load_held(buffer, field, size);
     return lock.release();
 }
 

@@ -6,6 +6,7 @@
 #include <type_traits>
 
 #include "thread/bt_srv_con/src/counts.h"
+#include "thread/bt_srv_con/src/shared_bytes.h"
 
 namespace bt::con {
 
@@ -74,7 +75,18 @@ int32_t write_field(const Element<Member>* in, Image image, uint32_t lock_flag)
     return result == BT_OK ? BT_OK : BT_FAILED;
 }
 
-// A copy of a field whose counts are possible ones, made without taking the lock.
+// A copy of a field whose counts are possible ones, for a caller that holds the lock.
+template <auto Member>
+int32_t copy_held(Field<Member>& copy)
+{
+    const BtConShareData* const attached = area();
+    if (attached == nullptr) return BT_FAILED;
+    load_held(first_of(copy), &(attached->*Member), sizeof copy);
+    make_possible(copy);
+    return BT_OK;
+}
+
+// The same without the lock.
 template <auto Member>
 int32_t copy_field(Field<Member>& copy)
 {
@@ -91,7 +103,7 @@ template <auto Member, class Store, class Change>
 int32_t change_held(Store store, Change change)
 {
     Field<Member> copy;
-    const int32_t read = copy_field<Member>(copy);
+    const int32_t read = copy_held<Member>(copy);
     if (read != BT_OK) return read;
 
     const int32_t changed = change(copy);
@@ -117,7 +129,7 @@ int32_t look_at_field(Look look)
     if (lock.taken() != BT_OK) return lock.taken();
 
     Field<Member> copy;
-    const int32_t read = copy_field<Member>(copy);
+    const int32_t read = copy_held<Member>(copy);
     if (read != BT_OK) return read;
 
     const int32_t looked = look(copy);

@@ -75,7 +75,7 @@ int32_t bt_con_getRegisteredDeviceDIDInfo(const BtDevAddress* addr, uint32_t key
     if (lock.taken() != BT_OK) return lock.taken();
 
     Entries list;
-    const int32_t read = copy_field<kList>(list);
+    const int32_t read = copy_held<kList>(list);
     if (read != BT_OK) return read;
 
     int32_t index = kEntries;

@@ -4,7 +4,6 @@
 #include <cstring>
 
 #include "thread/bt_srv_con/src/area.h"
-#include "thread/bt_srv_con/src/shared_bytes.h"
 
 namespace bt::con {
 

@@ -5,7 +5,6 @@
 #include "base/rooted_path.h"
 #include "thread/bt_srv_con/src/area.h"
 #include "thread/bt_srv_con/src/process_lock.h"
-#include "thread/bt_srv_con/src/shared_bytes.h"
 
 namespace bt::con {
 namespace {

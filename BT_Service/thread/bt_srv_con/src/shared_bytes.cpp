@@ -54,6 +54,11 @@ void store_unit(void* shared, size_t at, Unit value)
 
 } // namespace
 
+void load_held(void* to, const void* shared, size_t size)
+{
+    std::memcpy(to, shared, size);
+}
+
 void load(void* to, const void* shared, size_t size)
 {
     visit_all(shared, size, [=](auto unit, size_t at) {
