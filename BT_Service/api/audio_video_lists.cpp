@@ -32,9 +32,7 @@ int32_t copy_list(const ListLayout& list, uint32_t start, uint32_t count, BtAvpL
 
     result->header = area.read<uint32_t>(kHeaderAt);
     result->count = copied;
-    if (copied != 0) {
-        std::memcpy(result->entries, area.at(list.entries_at + start * list.entry_size), copied * list.entry_size);
-    }
+    area.copy_entries(list, start, copied, result->entries);
     return BT_OK;
 }
 

@@ -160,8 +160,9 @@ int32_t BT_SRV_AVP_setCharacterCode(struct character_code code)
 {
     Payload payload;
     payload.u8(code.first);
-    for (const uint32_t value : code.values)
+    for (const uint32_t value : code.values) {
         payload.be32(value);
+    }
     return post(Request::AVP_setCharacterCode, payload);
 }
 

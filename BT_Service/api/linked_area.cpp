@@ -25,6 +25,12 @@ uint32_t LinkedArea::room(const ListLayout& list) const
     return std::min(list.capacity, (size_ - list.entries_at) / list.entry_size);
 }
 
+void LinkedArea::copy_entries(const ListLayout& list, uint32_t first, uint32_t count, void* to) const
+{
+    if (count == 0) return;
+    std::memcpy(to, at(list.entries_at + first * list.entry_size), size_t{count} * list.entry_size);
+}
+
 AreaWriting::AreaWriting()
 {
     pthread_mutex_lock(&g_writing);

@@ -51,6 +51,7 @@ public:
 
     // The entries that list and area have room for.
     uint32_t room(const ListLayout& list) const;
+    void copy_entries(const ListLayout& list, uint32_t first, uint32_t count, void* to) const;
 
 private:
     uint8_t* start_ = nullptr;

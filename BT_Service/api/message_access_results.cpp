@@ -57,7 +57,7 @@ int32_t copy_list(const ListLayout& list, uint32_t maximum, uint32_t* count, voi
 
     const uint32_t copied = std::min({area.read<uint32_t>(0), area.room(list), maximum});
     *count = copied;
-    std::memcpy(entries, area.at(list.entries_at), copied * list.entry_size);
+    area.copy_entries(list, 0, copied, entries);
     return BT_OK;
 }
 
@@ -88,8 +88,9 @@ int32_t copy_instances(BtMapInstanceList* list)
     if (!area.has(kInstances.entries_at)) return BT_FAILED;
 
     const uint32_t stored = area.read<uint8_t>(offsetof(BtMapInstanceArea, count));
-    list->count = static_cast<uint8_t>(std::min(stored, area.room(kInstances)));
-    for (uint32_t i = 0; i < list->count; ++i) {
+    const uint32_t copied = std::min(stored, area.room(kInstances));
+    list->count = static_cast<uint8_t>(copied);
+    for (uint32_t i = 0; i < copied; ++i) {
         const uint32_t entry_at = kInstances.entries_at + i * kInstances.entry_size;
         copy_instance(area.read<BtMapInstanceEntry>(entry_at), &list->instance[i]);
     }

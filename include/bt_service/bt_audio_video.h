@@ -290,7 +290,8 @@ BT_API int32_t BT_SRV_AVP_STRCTL_setCapability(const void *record);
  * @param result  receives the list's header word and the number of entries copied; its entries pointer is the caller's
  *                array with room for `count` entries
  * @return 0 copied; 0 also when the service has not shared a list, which leaves the result as it was, so set its count
- *         to 0 beforehand; -1 null result, start + count above 100, or null array with something to copy: nothing written
+ *         to 0 beforehand; -1 null result, start + count above 100, or null array with something to copy: nothing is
+ *         written
  */
 BT_API int32_t BT_SRV_AVP_getMediaListData(uint32_t start, uint32_t count, struct list_result *result);
 

@@ -13,7 +13,8 @@
  *  4. A name or text longer than 256 bytes is cut to 256 without notice.
  *  5. The shared areas have no lock between processes. Read an area after the event that announces the result and
  *     before the next request of the same kind; issue no listing request before the service has answered the previous
- *     one; let one application at a time fill the push area.
+ *     one; let one application at a time fill the push area. Threads of one process never mix their data in an area,
+ *     but what comes later replaces what nobody has taken yet.
  *  6. Functions that read or fill a shared area return -1 and write nothing when the service has not shared it.
  */
 #ifndef BT_SERVICE_BT_MESSAGE_ACCESS_H
@@ -72,8 +73,8 @@ BT_API int32_t BT_SRV_MAP_getFolderList(uint32_t max_count, uint32_t start_offse
  *     period begin                16  "19000101T000000Z" when the filter has none
  *     period end                  16  "20991231T235959Z" when the filter has none
  *     read status                  1  low byte
- *     recipient length, recipient  1 + n
- *     originator length, originator 1 + n
+ *     recipient length and text    1 + n
+ *     originator length and text   1 + n
  *     priority                     1  low byte
  *     zero                         1
  *

@@ -7,8 +7,8 @@
  *  1. The argument records live in the calling process only and follow the compiler's natural alignment. The areas have
  *     one layout in every build, 32-bit or 64-bit, without gaps.
  *  2. Texts carry a length of their own and need no terminating zero.
- *  3. Words, attributes, texts and entries whose meaning is not given here belong to the message access service. They are
- *     copied as they are.
+ *  3. Words, attributes, texts and entries whose meaning is not given here belong to the message access service. They
+ *     are copied as they are.
  */
 #ifndef BT_SERVICE_BT_MESSAGE_ACCESS_RECORDS_H
 #define BT_SERVICE_BT_MESSAGE_ACCESS_RECORDS_H
@@ -26,7 +26,7 @@
 enum BtMapCapacity {
     BT_MAP_HANDLE_SIZE = 16,           /**< bytes of a message handle */
     BT_MAP_TEXT_MAX = 256,             /**< bytes of a name or text in an argument record */
-    BT_MAP_DATE_TIME_SIZE = 16,        /**< characters of a date and time, "20261122T235959Z" */
+    BT_MAP_DATE_TIME_SIZE = 16,        /**< characters of a date and time */
     BT_MAP_MESSAGE_MAX = 150,          /**< entries of the message list */
     BT_MAP_MESSAGE_ENTRY_SIZE = 1648,  /**< bytes of a message list entry */
     BT_MAP_FOLDER_MAX = 100,           /**< entries of the folder list */
@@ -50,12 +50,16 @@ typedef struct message_handle BtMapMessageHandle;
 BT_ASSERT(sizeof(BtMapMessageHandle) == 20, BtMapMessageHandle_size);
 BT_ASSERT_AT(BtMapMessageHandle, option, 16);
 
-/** Which messages of which folder to count or list. */
+/**
+ * Which messages of which folder to count or list.
+ *
+ * Begin and end of the period are 16 characters each, year to second: "20261122T235959Z".
+ */
 struct message_filter {
     uint32_t folder_length;                  /*   0  above 256 counts as 256                   */
     uint8_t folder[BT_MAP_TEXT_MAX];         /*   4                                            */
     uint8_t type;                            /* 260  message types                             */
-    char period_begin[BT_MAP_DATE_TIME_SIZE]; /* 261  all zero: 1900-01-01                     */
+    char period_begin[BT_MAP_DATE_TIME_SIZE]; /* 261  all zero: start of 1900                  */
     char period_end[BT_MAP_DATE_TIME_SIZE];  /* 277  all zero: end of 2099                     */
     uint32_t read_status;                    /* 296  its low byte is sent                      */
     uint8_t recipient_length;                /* 300                                            */
