@@ -58,7 +58,7 @@ BT_ASSERT_AT(BtAvpListResult, count, 4);
 BT_ASSERT_AT(BtAvpListResult, entries, 8);
 
 /** The media list, shared as "/tmp/shm_avp_medialst". */
-typedef struct {
+typedef struct BtAvpMediaListArea {
     uint32_t header;           /*  0  handed to readers as it is                           */
     uint32_t count;            /*  4  entries in use, 0..100                               */
     uint32_t reserved;         /*  8  belongs to the service                               */
@@ -70,7 +70,7 @@ BT_ASSERT_AT(BtAvpMediaListArea, reserved, 8);
 BT_ASSERT_AT(BtAvpMediaListArea, entries, 12);
 
 /** The player list, shared as "/tmp/shm_avp_playerlst". */
-typedef struct {
+typedef struct BtAvpPlayerListArea {
     uint32_t header;           /*  0  handed to readers as it is                           */
     uint32_t count;            /*  4  entries in use, 0..100                               */
     uint32_t reserved;         /*  8  belongs to the service                               */

@@ -20,7 +20,7 @@
 #include <bt_service/bt_types.h>
 
 /** What a connection request asks for. */
-typedef struct {
+typedef struct BtConParameters {
     uint32_t profile;          /*  0  0..8, not 4                                     */
     uint32_t values[6];        /*  4  meaning depends on the profile                  */
 } BtConParameters;
@@ -28,7 +28,7 @@ BT_ASSERT_SIZE(BtConParameters, 28);
 BT_ASSERT_AT(BtConParameters, values, 4);
 
 /** The profiles to which an accepted connection is limited; begins like a `BtConProfileFilter`. */
-typedef struct {
+typedef struct BtConProfileFilterBlock {
     int32_t count;             /*  0  entries in use; 0 or less: no filter            */
     uint32_t profiles[8];      /*  4  sent whole                                      */
 } BtConProfileFilterBlock;
@@ -36,19 +36,19 @@ BT_ASSERT_SIZE(BtConProfileFilterBlock, 36);
 BT_ASSERT_AT(BtConProfileFilterBlock, profiles, 4);
 
 /** The passkey of an authentication reply; sent as it is. */
-typedef struct {
+typedef struct BtConPasskey {
     uint8_t bytes[8];          /*  0                                                  */
 } BtConPasskey;
 BT_ASSERT_SIZE(BtConPasskey, 8);
 
 /** The PIN code of an authentication reply; sent as it is. */
-typedef struct {
+typedef struct BtConPinCode {
     uint8_t bytes[20];         /*  0                                                  */
 } BtConPinCode;
 BT_ASSERT_SIZE(BtConPinCode, 20);
 
 /** The service that a service discovery looks for; sent as it is. */
-typedef struct {
+typedef struct BtConServiceId {
     uint8_t bytes[24];         /*  0                                                  */
 } BtConServiceId;
 BT_ASSERT_SIZE(BtConServiceId, 24);

@@ -39,7 +39,7 @@ enum BtConCharSet {
 };
 
 /** Name of a device. */
-typedef struct {
+typedef struct BtConDeviceName {
     uint32_t char_set;               /*   0  character set of the text, see BtConCharSet   */
     uint32_t name_length;            /*   4  bytes of the text, as given                   */
     uint8_t name_text[BT_CON_NAME_TEXT_SIZE]; /* 8  never interpreted                      */
@@ -50,7 +50,7 @@ BT_ASSERT_AT(BtConDeviceName, name_length, 4);
 BT_ASSERT_AT(BtConDeviceName, name_text, 8);
 
 /** One profile of a registered device. */
-typedef struct {
+typedef struct BtConProfileEntry {
     uint32_t connected;              /*  0  1 the profile is connected                     */
     uint32_t supported;              /*  4  1 the device supports the profile              */
     uint32_t profile_value;          /*  8  stored as given                                */
@@ -65,7 +65,7 @@ BT_ASSERT_AT(BtConProfileEntry, profile_value, 8);
  *
  * The empty record of an unused slot is zero but for the values named in the last column.
  */
-typedef struct {
+typedef struct BtConRegDevInfo {
     BtConDeviceName name;            /*   0                                  char_set 3    */
     BtDevAddress bd_addr;            /* 256                                  FF x 6        */
     uint32_t device_class;           /* 264  stored as given                               */
@@ -88,7 +88,7 @@ BT_ASSERT_AT(BtConRegDevInfo, ext_info_2, 452);
 BT_ASSERT_AT(BtConRegDevInfo, ext_info_3, 476);
 
 /** The registered devices in the order in which they were added; word i of each array belongs to the device in slot i. */
-typedef struct {
+typedef struct BtConRegDevListInfo {
     int32_t device_num;              /*     0  0..17                                       */
     BtConRegDevInfo device[BT_CON_DEVICE_MAX];     /*     4  slots behind device_num are empty records   */
     uint32_t device_attribute[BT_CON_DEVICE_MAX];  /* 17140  stored as given; 0 in an unused slot        */
@@ -103,7 +103,7 @@ BT_ASSERT_AT(BtConRegDevListInfo, connection_mode, 17208);
 BT_ASSERT_AT(BtConRegDevListInfo, local_role, 17276);
 
 /** Devices in the order in which the service tries them; an address appears at most once. */
-typedef struct {
+typedef struct BtConOrderList {
     int32_t num;                     /*  0  0..17                                          */
     BtDevAddress addr[BT_CON_DEVICE_MAX]; /* 4  slots behind num hold FF x 6               */
 } BtConOrderList;
@@ -112,7 +112,7 @@ BT_ASSERT_AT(BtConOrderList, num, 0);
 BT_ASSERT_AT(BtConOrderList, addr, 4);
 
 /** A device ID value under its key. */
-typedef struct {
+typedef struct BtConDidSlot {
     uint32_t did_key;                /*  0  0 marks a free slot                            */
     uint8_t did_value[BT_CON_DID_VALUE_SIZE]; /* 4  stored as given                        */
 } BtConDidSlot;
@@ -121,7 +121,7 @@ BT_ASSERT_AT(BtConDidSlot, did_key, 0);
 BT_ASSERT_AT(BtConDidSlot, did_value, 4);
 
 /** The device ID values of one device; a list of them ends at the first entry whose address is FF x 6. */
-typedef struct {
+typedef struct BtConDidInfoEntry {
     BtDevAddress bd_addr;            /*  0  all 8 bytes as given                           */
     BtConDidSlot slot[BT_CON_DID_SLOTS]; /* 8  filled from slot 0, a key at most once      */
 } BtConDidInfoEntry;
@@ -130,7 +130,7 @@ BT_ASSERT_AT(BtConDidInfoEntry, bd_addr, 0);
 BT_ASSERT_AT(BtConDidInfoEntry, slot, 8);
 
 /** A device found by a search; laid out like the head of BtConRegDevInfo. */
-typedef struct {
+typedef struct BtConDevInfo {
     BtConDeviceName name;            /*   0                                                */
     BtDevAddress bd_addr;            /* 256                                                */
     uint32_t device_class;           /* 264  stored as given                               */
@@ -141,7 +141,7 @@ BT_ASSERT_AT(BtConDevInfo, bd_addr, 256);
 BT_ASSERT_AT(BtConDevInfo, device_class, 264);
 
 /** The devices of the last search in the order in which they were first reported. */
-typedef struct {
+typedef struct BtConSearchDevList {
     int32_t num;                     /*  0  0..32                                          */
     BtConDevInfo device[BT_CON_SEARCH_MAX]; /* 4  slots behind num: zero but for FF x 6    */
 } BtConSearchDevList;
@@ -150,7 +150,7 @@ BT_ASSERT_AT(BtConSearchDevList, num, 0);
 BT_ASSERT_AT(BtConSearchDevList, device, 4);
 
 /** The connection data area. The fields up to the search list are persistent: BtConPersistentData has the same bytes. */
-typedef struct {
+typedef struct BtConShareData {
     BtConRegDevListInfo registered_device_list_info;                          /*     0  registered devices   */
     BtConOrderList registered_order_list;                                     /* 17344  oldest first         */
     BtConOrderList profile_connected_order_list[BT_CON_PROFILE_INDEXES];      /* 17484  most recent first    */
@@ -177,7 +177,7 @@ BT_ASSERT_AT(BtConShareData, simplepairing_capability, 27784);
 BT_ASSERT_AT(BtConShareData, bluetooth_set_val, 27792);
 
 /** The part of the area that survives a restart: its first bytes, field for field. */
-typedef struct {
+typedef struct BtConPersistentData {
     BtConRegDevListInfo registered_device_list_info;                          /*     0  */
     BtConOrderList registered_order_list;                                     /* 17344  */
     BtConOrderList profile_connected_order_list[BT_CON_PROFILE_INDEXES];      /* 17484  */
@@ -190,7 +190,7 @@ BT_ASSERT_AT(BtConPersistentData, profile_connected_order_list, 17484);
 BT_ASSERT_AT(BtConPersistentData, registered_device_did_info_list, 18604);
 
 /** The image file that mirrors the persistent part. Bytes behind it in the file are ignored. */
-typedef struct {
+typedef struct BtConFromImage {
     uint8_t magic[5];                /*  0  "BTCN" and a zero byte                         */
     uint8_t init_request;            /*  5  written as 0; anything else asks for defaults  */
     uint8_t reserved[2];             /*  6  written as 0, not looked at                    */
@@ -210,14 +210,14 @@ BT_ASSERT_AT(BtConFromImage, data, 12);
  * A filter for three profiles is `struct { BtConProfileFilter head; uint32_t indexes[3]; }` with a count of 3. The
  * caller guarantees that as many words follow as the count says.
  */
-typedef struct {
+typedef struct BtConProfileFilter {
     int32_t count;                   /*  0  below 1 matches nothing                        */
 } BtConProfileFilter;
 BT_ASSERT_SIZE(BtConProfileFilter, 4);
 BT_ASSERT_AT(BtConProfileFilter, count, 0);
 
 /** What this process is attached to. Local to the process: two native words, never in shared memory. */
-typedef struct {
+typedef struct BtConShareHandle {
     uint32_t semaphore;              /* first word   handle of the area's lock; 0 none yet */
     BtConShareData *area;            /* second word  null while not attached               */
 } BtConShareHandle;

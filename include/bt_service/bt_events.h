@@ -18,7 +18,7 @@ BT_EXTERN_C_BEGIN
 enum { BT_EVT_LISTENERS_MAX = 50, BT_EVT_IDS_MAX = 35 };
 
 /** A listener. */
-typedef struct {
+typedef struct BtEvtListener {
     uint32_t handle;                    /*  0  handle of the registration; 0 marks a free entry */
     uint16_t pno;                       /*  4  process number of the listener                   */
     uint16_t reserved;                  /*  6  zero                                             */
@@ -37,7 +37,7 @@ BT_ASSERT_AT(BtEvtListener, event_count, 16);
 BT_ASSERT_AT(BtEvtListener, event_ids, 20);
 
 /** The shared data "/tmp/shm_eds_regist_table", under the lock "BT_SRV_EDS_SEM_NAME". */
-typedef struct {
+typedef struct BtEvtListenerTable {
     uint32_t next_handle;                        /* 0  handle of the next registration; 0: not initialised */
     BtEvtListener entries[BT_EVT_LISTENERS_MAX]; /* 4                                                      */
 } BtEvtListenerTable;

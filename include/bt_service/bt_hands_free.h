@@ -24,19 +24,19 @@
 /* ---- records of requests */
 
 /** An AT command; sent as it is. */
-typedef struct {
+typedef struct BtHfpAtCommand {
     uint8_t bytes[48];         /*  0                                                  */
 } BtHfpAtCommand;
 BT_ASSERT_SIZE(BtHfpAtCommand, 48);
 
 /** The number to dial; sent as it is. */
-typedef struct {
+typedef struct BtHfpDialNumber {
     uint8_t bytes[84];         /*  0                                                  */
 } BtHfpDialNumber;
 BT_ASSERT_SIZE(BtHfpDialNumber, 84);
 
 /** DTMF tones to send. */
-typedef struct {
+typedef struct BtHfpDtmf {
     int32_t count;             /*  0  characters in use, up to 256; 0 or less: none   */
     char characters[256];      /*  4  0-9 A-D a-d # *; always sent whole              */
 } BtHfpDtmf;
@@ -44,7 +44,7 @@ BT_ASSERT_SIZE(BtHfpDtmf, 260);
 BT_ASSERT_AT(BtHfpDtmf, characters, 4);
 
 /** A volume of the phone. */
-typedef struct {
+typedef struct BtHfpVolume {
     uint32_t target;           /*  0  0 or 1                                          */
     uint8_t level;             /*  4  1..15                                           */
     uint8_t further[3];        /*  5  sent as they are                                */
@@ -54,7 +54,7 @@ BT_ASSERT_AT(BtHfpVolume, level, 4);
 BT_ASSERT_AT(BtHfpVolume, further, 5);
 
 /** Codec values; sent as they are. */
-typedef struct {
+typedef struct BtHfpCodec {
     uint8_t bytes[57];         /*  0                                                  */
 } BtHfpCodec;
 BT_ASSERT_SIZE(BtHfpCodec, 57);
@@ -66,7 +66,7 @@ enum {
 };
 
 /** What the phone (the audio gateway) supports. */
-typedef struct {
+typedef struct BtHfpAgFunctions {
     uint32_t words[4];         /*  0                                                  */
     uint32_t inband_ring_tone; /* 16  the phone sends its own ring tone               */
     uint32_t more_words[4];    /* 20                                                  */
@@ -76,19 +76,19 @@ BT_ASSERT_AT(BtHfpAgFunctions, inband_ring_tone, 16);
 BT_ASSERT_AT(BtHfpAgFunctions, more_words, 20);
 
 /** What the phone supports of calls with three parties. */
-typedef struct {
+typedef struct BtHfpThreewayCall {
     uint32_t words[7];         /*  0                                                  */
 } BtHfpThreewayCall;
 BT_ASSERT_SIZE(BtHfpThreewayCall, 28);
 
 /** One call, as the hands-free service writes it. */
-typedef struct {
+typedef struct BtHfpCall {
     uint8_t bytes[100];        /*  0                                                  */
 } BtHfpCall;
 BT_ASSERT_SIZE(BtHfpCall, 100);
 
 /** The call list, as the hands-free service writes it. */
-typedef struct {
+typedef struct BtHfpCallList {
     uint32_t header;           /*  0                                                  */
     BtHfpCall calls[BT_HFP_CALLS]; /*  4                                              */
 } BtHfpCallList;
@@ -96,7 +96,7 @@ BT_ASSERT_SIZE(BtHfpCallList, 1004);
 BT_ASSERT_AT(BtHfpCallList, calls, 4);
 
 /** The hands-free status area: shared data "BT_HFP_SHARE_DATA_NAME", lock "BT_HFP_SEMAPHORE_NAME". */
-typedef struct {
+typedef struct BtHfpStatusArea {
     uint32_t signal_level;     /*   0  initially 6                                    */
     uint32_t service_area;     /*   4  initially 2, as all words up to the call list  */
     uint32_t roaming;          /*   8                                                 */

@@ -32,7 +32,7 @@ typedef void (*BT_CMN_logout)(const char* tag, const char* format, ...) BT_PRINT
 enum { BT_LOG_FIRST_NAMED_ZONE = 10, BT_LOG_ZONE_NAMES = 502, BT_LOG_ZONE_NAME_SIZE = 24, BT_LOG_ZONE_WORDS = 17 };
 
 /** The platform logger's parameter block: filled by the library, kept by the logger. */
-typedef struct {
+typedef struct BtLogParameters {
     uint8_t version;                                           /*     0  2                                   */
     char zone_names[BT_LOG_ZONE_NAMES][BT_LOG_ZONE_NAME_SIZE]; /*     1  first that of zone 10; zero-filled  */
     uint8_t reserved[3];                                       /* 12049  zero                                */

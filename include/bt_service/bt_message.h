@@ -16,7 +16,7 @@ enum {
     BT_MESSAGE_SIZE = 1024
 };
 
-typedef struct {
+typedef struct BtMessageHeaderFields {
     uint32_t reserved;         /*  0  zero                                            */
     uint16_t src_pno;          /*  4  process number of the sending side              */
     uint16_t alt_pno;          /*  6  0xFF02 in connection requests, else zero        */
@@ -31,12 +31,12 @@ BT_ASSERT_AT(BtMessageHeaderFields, cid, 8);
 BT_ASSERT_AT(BtMessageHeaderFields, len, 10);
 BT_ASSERT_AT(BtMessageHeaderFields, reserved2, 12);
 
-typedef struct {
+typedef struct BtMessageHeader {
     BtMessageHeaderFields hdr; /*  0  reached as msg_header.hdr                       */
 } BtMessageHeader;
 BT_ASSERT_SIZE(BtMessageHeader, 16);
 
-typedef struct {
+typedef struct BtMessage {
     BtMessageHeader msg_header;               /*  0                                   */
     uint8_t payload[BT_MESSAGE_PAYLOAD_MAX];  /* 16  the first len bytes are valid    */
 } BtMessage;

@@ -223,7 +223,7 @@ BT_ASSERT_AT(BtMapPushRecord, body, sizeof(void *) == 8 ? 8152 : 8148);
 /* ---- server instances */
 
 /** A message access server of the remote device. */
-typedef struct {
+typedef struct BtMapInstance {
     uint8_t id;                              /*  0                                             */
     uint8_t name_length;                     /*  1  0..64                                      */
     uint8_t name[BT_MAP_INSTANCE_NAME_MAX];  /*  2  the first name_length bytes are valid      */
@@ -235,7 +235,7 @@ BT_ASSERT_AT(BtMapInstance, name, 2);
 BT_ASSERT_AT(BtMapInstance, attribute, 66);
 
 /** The message access servers of the remote device. */
-typedef struct {
+typedef struct BtMapInstanceList {
     uint8_t count;                           /*  0  0..12                                      */
     BtMapInstance instance[BT_MAP_INSTANCE_MAX]; /* 1  the first count are valid               */
 } BtMapInstanceList;
@@ -245,13 +245,13 @@ BT_ASSERT_AT(BtMapInstanceList, instance, 1);
 /* ---- shared areas */
 
 /** The start of the service request area; `length` bytes of a parameter block follow it. */
-typedef struct {
+typedef struct BtMapRequestArea {
     uint32_t length;                         /*  0  bytes of the parameter block               */
 } BtMapRequestArea;
 BT_ASSERT_SIZE(BtMapRequestArea, 4);
 
 /** The start of the message area; the body follows it, up to the area's end. */
-typedef struct {
+typedef struct BtMapMessageArea {
     uint32_t lead;                           /*    0  belongs to the service                   */
     uint32_t header[5];                      /*    4                                           */
     BtMapMessageGroup group[3];              /*   24                                           */
@@ -278,7 +278,7 @@ BT_ASSERT_AT(BtMapMessageArea, body_pointer, 8168);
 BT_ASSERT(sizeof(BtMapMessageArea) + BT_MAP_BODY_MAX == BT_MAP_MESSAGE_AREA_SIZE, BtMapMessageArea_body);
 
 /** The start of the push area; the body follows it, up to the area's end. */
-typedef struct {
+typedef struct BtMapPushArea {
     uint32_t header_5;                       /*    0                                           */
     BtMapMessageGroup group[3];              /*    4  the first one is written                 */
     uint32_t tail;                           /* 7876                                           */
@@ -303,7 +303,7 @@ BT_ASSERT_AT(BtMapPushArea, body_address, 8148);
 BT_ASSERT(sizeof(BtMapPushArea) + BT_MAP_PUSH_BODY_MAX == BT_MAP_PUSH_AREA_SIZE, BtMapPushArea_body);
 
 /** The message list area. */
-typedef struct {
+typedef struct BtMapMessageListArea {
     uint32_t count;                          /*  0  entries in use, 0..150                     */
     uint8_t reserved[12];                    /*  4  belongs to the service                     */
     uint8_t entries[BT_MAP_MESSAGE_MAX][BT_MAP_MESSAGE_ENTRY_SIZE]; /* 16                      */
@@ -313,7 +313,7 @@ BT_ASSERT_AT(BtMapMessageListArea, reserved, 4);
 BT_ASSERT_AT(BtMapMessageListArea, entries, 16);
 
 /** The folder list area. */
-typedef struct {
+typedef struct BtMapFolderListArea {
     uint32_t count;                          /*  0  entries in use, 0..100                     */
     uint8_t entries[BT_MAP_FOLDER_MAX][BT_MAP_FOLDER_ENTRY_SIZE]; /* 4                         */
 } BtMapFolderListArea;
@@ -321,7 +321,7 @@ BT_ASSERT_SIZE(BtMapFolderListArea, 26004);
 BT_ASSERT_AT(BtMapFolderListArea, entries, 4);
 
 /** An entry of the server instance area. */
-typedef struct {
+typedef struct BtMapInstanceEntry {
     uint8_t reserved[8];                     /*  0  belongs to the service                     */
     uint8_t id;                              /*  8                                             */
     uint8_t name_length;                     /*  9  0..64                                      */
@@ -337,7 +337,7 @@ BT_ASSERT_AT(BtMapInstanceEntry, attribute, 74);
 BT_ASSERT_AT(BtMapInstanceEntry, reserved_end, 75);
 
 /** The server instance area. */
-typedef struct {
+typedef struct BtMapInstanceArea {
     uint8_t count;                           /*   0  entries in use, 0..12                     */
     uint8_t reserved[3];                     /*   1  belongs to the service                    */
     BtMapInstanceEntry entries[BT_MAP_INSTANCE_MAX]; /* 4                                      */

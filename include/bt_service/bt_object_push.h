@@ -23,7 +23,7 @@ enum {
 };
 
 /** A length-prefixed record of the largest size. */
-typedef struct {
+typedef struct BtOppRecord {
     uint16_t length;               /*  0  bytes of the body in use, 0..1,006              */
     uint8_t body[BT_OPP_BODY_MAX]; /*  2                                                  */
 } BtOppRecord;

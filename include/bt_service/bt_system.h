@@ -27,13 +27,13 @@ enum {
 };
 
 /** What the service is started with; sent as it is. */
-typedef struct {
+typedef struct BtSysStart {
     uint8_t bytes[4];          /*  0                                                  */
 } BtSysStart;
 BT_ASSERT_SIZE(BtSysStart, 4);
 
 /** Name of the local device. */
-typedef struct {
+typedef struct BtSysName {
     uint8_t length;            /*  0  bytes of text, 0..255                           */
     uint8_t reserved[3];       /*  1  not read                                        */
     char text[255];            /*  4  not closed by a zero                            */
@@ -42,25 +42,25 @@ BT_ASSERT_SIZE(BtSysName, 259);
 BT_ASSERT_AT(BtSysName, text, 4);
 
 /** Device ID information of the local device. */
-typedef struct {
+typedef struct BtSysDid {
     uint8_t bytes[8];          /*  0                                                  */
 } BtSysDid;
 BT_ASSERT_SIZE(BtSysDid, 8);
 
 /** The device that carries the audio of calls; sent as it is. */
-typedef struct {
+typedef struct BtSysScoDevice {
     uint8_t bytes[8];          /*  0                                                  */
 } BtSysScoDevice;
 BT_ASSERT_SIZE(BtSysScoDevice, 8);
 
 /** How the FTS log is started; sent as it is. */
-typedef struct {
+typedef struct BtSysFtsStart {
     uint8_t bytes[42];         /*  0                                                  */
 } BtSysFtsStart;
 BT_ASSERT_SIZE(BtSysFtsStart, 42);
 
 /** An HCI command packet for the controller (Bluetooth Core Specification, UART transport). */
-typedef struct {
+typedef struct BtSysHciCommand {
     uint8_t packet_length;     /*  0  bytes of the packet: 4 + parameter_length       */
     uint8_t packet_type;       /*  1  1, a command                                    */
     uint8_t opcode[2];         /*  2  low byte first                                  */
@@ -72,7 +72,7 @@ BT_ASSERT_AT(BtSysHciCommand, opcode, 2);
 BT_ASSERT_AT(BtSysHciCommand, parameters, 5);
 
 /** Parameters of the receive test. */
-typedef struct {
+typedef struct BtSysRxTest {
     uint32_t mode;             /*  0  0: answer inquiries and pages; else: receive    */
     int32_t channel;           /*  4  radio channel, 0..78                            */
 } BtSysRxTest;
@@ -80,7 +80,7 @@ BT_ASSERT_SIZE(BtSysRxTest, 8);
 BT_ASSERT_AT(BtSysRxTest, channel, 4);
 
 /** Parameters of the transmit test. */
-typedef struct {
+typedef struct BtSysTxTest {
     uint32_t mode;             /*  0  0: parameters 0 and 1 are 0; else: 3, channel   */
     uint32_t channel;          /*  4  radio channel, 0..78; a larger one is sent as 0 */
     uint32_t packet_type;      /*  8  0..11: DM1 DH1 DM3 DH3 DM5 DH5 2-DH1 2-DH3      */
@@ -93,7 +93,7 @@ BT_ASSERT_AT(BtSysTxTest, packet_type, 8);
 BT_ASSERT_AT(BtSysTxTest, parameter_8, 16);
 
 /** Parameters of the carrier test. */
-typedef struct {
+typedef struct BtSysCarrierTest {
     int32_t channel;           /*  0  radio channel, 0..78                            */
     uint32_t parameter_3;      /*  4  low byte is the controller's parameter 3        */
 } BtSysCarrierTest;
@@ -101,7 +101,7 @@ BT_ASSERT_SIZE(BtSysCarrierTest, 8);
 BT_ASSERT_AT(BtSysCarrierTest, parameter_3, 4);
 
 /** The local device as the system manager describes it: start of the shared data "/tmp/shm_sysmgr_local_devinfo". */
-typedef struct {
+typedef struct BtSysLocalDevice {
     uint8_t bytes[340];        /*   0                                                 */
     BtSysDid did;              /* 340  device ID information                          */
 } BtSysLocalDevice;

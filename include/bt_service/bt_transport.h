@@ -16,7 +16,7 @@
 BT_EXTERN_C_BEGIN
 
 /** A row of a request-response table; a row with BT_RESPONSE_END in both ids ends the table. */
-typedef struct {
+typedef struct BtResponseRow {
     uint16_t request;          /*  0  id of the request             */
     uint16_t response;         /*  2  id of its response            */
     uint16_t data_size;        /*  4  payload bytes of the response */

@@ -87,7 +87,7 @@ enum BtProcessNumber {
  *
  * Only the six address bytes are compared. FF FF FF FF FF FF means no device; all zero is a valid address.
  */
-typedef struct {
+typedef struct BtDevAddress {
     uint8_t address[6];        /*  0  in the order in which the caller gives them */
     uint8_t padding[2];        /*  6  carried along, never compared               */
 } BtDevAddress;

@@ -96,7 +96,7 @@ enum BtSimResult {
 };
 
 /** Payload of CON_CONNECTION, CON_CANCEL_CONNECTION and CON_DISCONNECTION. */
-typedef struct {
+typedef struct BtSimConnectionResult {
     uint32_t result;                  /*  0  BtSimResult                                    */
     BtDevAddress address;             /*  4                                                 */
     uint32_t profile;                 /* 12  profile number 0..8                            */
@@ -105,7 +105,7 @@ typedef struct {
 BT_ASSERT_SIZE(BtSimConnectionResult, 20);
 
 /** Payload of CON_DEVICE_FOUND; travels without the unused end of the name. */
-typedef struct {
+typedef struct BtSimDeviceFound {
     BtDevAddress address;             /*  0                                                 */
     uint32_t device_class;            /*  8  class of device                                */
     uint32_t name_length;             /* 12  bytes in name, 0..248                          */
@@ -114,14 +114,14 @@ typedef struct {
 BT_ASSERT_SIZE(BtSimDeviceFound, 264);
 
 /** Payload of CON_SEARCH. */
-typedef struct {
+typedef struct BtSimSearchResult {
     uint32_t result;                  /*  0  BtSimResult; BT_SIM_CANCELLED when cut short   */
     uint32_t count;                   /*  4  devices found                                  */
 } BtSimSearchResult;
 BT_ASSERT_SIZE(BtSimSearchResult, 8);
 
 /** Payload of CON_NUMERIC_REQUEST; answered with BT_SRV_CON_authenticateNumericValue(). */
-typedef struct {
+typedef struct BtSimNumericRequest {
     BtDevAddress address;             /*  0                                                 */
     uint32_t value;                   /*  8  six decimal digits that both sides show        */
 } BtSimNumericRequest;

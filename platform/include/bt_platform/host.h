@@ -37,9 +37,8 @@ BT_PLATFORM_API const char *bt_host_domain(void);
 BT_PLATFORM_API const char *bt_host_error(void);
 
 /**
- * Creates the domain. Processes may do so at the same time: one gets 0, the others 1.
- *
- * Takes up to half a second when the process that was creating it died.
+ * Creates the domain. Processes may do so at the same time: one gets 0, the others 1. Nothing that a process killed at it
+ * left behind is in the way.
  *
  * @return 0 created; 1 it existed already; -1 failure
  */
@@ -108,7 +107,7 @@ BT_PLATFORM_API int32_t bt_host_create_data(const char *name, uint32_t size);
 BT_PLATFORM_API int32_t bt_host_remove_data(const char *name);
 
 /** A process number and its queue. */
-typedef struct {
+typedef struct BtHostQueue {
     uint32_t pno;
     uint32_t owner_pid;              /**< 0 when the owner is gone */
     uint32_t queued;                 /**< messages that wait */
@@ -118,14 +117,14 @@ typedef struct {
 } BtHostQueue;
 
 /** A named lock. */
-typedef struct {
+typedef struct BtHostLock {
     char name[BT_HOST_NAME_MAX];
     uint32_t holder_pid;             /**< 0 when free */
     uint32_t recovered;              /**< times it was handed on from a dead holder */
 } BtHostLock;
 
 /** Named shared data. */
-typedef struct {
+typedef struct BtHostData {
     char name[BT_HOST_NAME_MAX];
     uint32_t size;
 } BtHostData;
