@@ -153,7 +153,7 @@ bool Children::reaped(pid_t pid, int status)
     if (ending_) return true;
 
     found->failures = served ? 1 : found->failures + 1;
-    const std::string who = fmt::format("{} ({:#06X}, process {})", found->service->name, found->service->pno, pid);
+    const std::string who = fmt::format("{} (0x{:04X}, process {})", found->service->name, found->service->pno, pid);
     if (!reached_ready && found->failures >= kFailuresAtStart) {
         fmt::print(stderr, "btsvc-sim: {} {} before it served, {} times; mend what it says above and start again\n",
                    who, how_it_ended(status), found->failures);

@@ -62,7 +62,7 @@ std::vector<BtHostQueue> live_queues_without_ending_services()
             if (is_service(queue.pno)) service = &queue;
         if (service == nullptr) return live;
         if (tries == kTries)
-            throw DomainTaken(fmt::format("domain \"{}\": process {} still serves number {:#06X}; end it, or choose "
+            throw DomainTaken(fmt::format("domain \"{}\": process {} still serves number 0x{:04X}; end it, or choose "
                                           "another domain with --domain",
                                           bt_host_domain(), service->owner_pid, service->pno));
         usleep(20000);

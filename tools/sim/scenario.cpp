@@ -92,7 +92,6 @@ void read_pairing(const JsonReader& object, Phone& phone)
                                                            {"passkey", Pairing::passkey},
                                                            {"numeric", Pairing::numeric},
                                                            {"refuse", Pairing::refuse}};
-    object.expect_only({"method", "pin", "passkey", "value"});
     const std::string method = object.text("method", "just_works", 32);
     const auto found = methods.find(method);
     if (found == methods.end())
@@ -100,12 +99,18 @@ void read_pairing(const JsonReader& object, Phone& phone)
                       "use one of: just_works, pin, passkey, numeric, refuse");
 
     phone.pairing = found->second;
-    phone.numeric_value = object.number("value", 123456, 0, 999999);
+    if (phone.pairing == Pairing::just_works || phone.pairing == Pairing::refuse) object.expect_only({"method"});
+    if (phone.pairing == Pairing::numeric) {
+        object.expect_only({"method", "value"});
+        phone.numeric_value = object.number("value", 123456, 0, 999999);
+    }
     if (phone.pairing == Pairing::pin) {
+        object.expect_only({"method", "pin"});
         phone.key = object.required_text("pin", 16);
         if (phone.key.empty()) object.refuse("pin", "is empty", "write 1 to 16 characters");
     }
     if (phone.pairing == Pairing::passkey) {
+        object.expect_only({"method", "passkey"});
         phone.key = object.required_text("passkey", 6);
         if (!only_digits(phone.key)) object.refuse("passkey", "is not a number", "write up to six digits in quotes");
     }

@@ -61,7 +61,7 @@ int run_service_process(const Service& service, const Scenario& scenario, int re
 {
     supervisor_fd = ready_fd;
     if (bt_host_claim_pno(service.pno) != 0) {
-        fmt::print(stderr, "btsvc-sim: {}: number {:#06X} cannot be had: {}\n", service.name, service.pno,
+        fmt::print(stderr, "btsvc-sim: {}: number 0x{:04X} cannot be had: {}\n", service.name, service.pno,
                    bt_host_error());
         return EXIT_FAILURE;
     }

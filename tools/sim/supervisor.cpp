@@ -11,6 +11,7 @@
 #include <csignal>
 #include <cstdio>
 #include <cstring>
+#include <fcntl.h>
 #include <poll.h>
 #include <sys/signalfd.h>
 #include <sys/stat.h>
@@ -128,6 +129,8 @@ int run_unit(const UnitOptions& options)
 {
     try {
         const int signal_fd = open_signals();
+        // The services must not keep it open.
+        if (options.ready_fd >= 0) fcntl(options.ready_fd, F_SETFD, FD_CLOEXEC);
         umask(S_IRWXG | S_IRWXO);
         take_domain();
         const RemoveDomainAtEnd remove_domain;
