@@ -13,6 +13,14 @@
  *
  * Payload fields are listed in order as "name:type", separated by blanks: u32 and i32 in the machine's byte order, addr
  * a device address slot of 8 bytes, bytes[n] and text[n] with a number or the name of an earlier field.
+ *
+ * What the interface leaves to the service, the simulated unit reads so:
+ *
+ *  - `reply` of an authentication, and `first` of CON_acceptConnection: 0 agrees, anything else refuses.
+ *  - PIN block: a length word and up to 16 characters. Passkey block: up to 8 digits, ended by a zero byte.
+ *  - Service identifier block: a length word, 2, 4 or 16, and that many bytes of the UUID, most significant first.
+ *  - Discoverable mode 0 is not discoverable; then the scan mode is 2 (page scan), else 3 (inquiry and page scan).
+ *  - `flag` of CON_requestAllDisconnection: 0 the given device, anything else every device.
  */
 #ifndef BT_SIM_EVENTS_H
 #define BT_SIM_EVENTS_H

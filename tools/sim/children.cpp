@@ -19,7 +19,7 @@ namespace bt::sim {
 namespace {
 
 constexpr auto kServedForAWhile = std::chrono::seconds(2);
-constexpr int kFailuresAtStart = 5;
+constexpr int kMostFailedStarts = 5;
 constexpr int kLongestBackOffMs = 1000;
 
 // The first restart is immediate, the following ones are further and further apart.
@@ -153,10 +153,13 @@ bool Children::reaped(pid_t pid, int status)
     if (ending_) return true;
 
     found->failures = served ? 1 : found->failures + 1;
+    // Whoever kills a service while it starts does not make it one that cannot start.
+    const bool killed = WIFSIGNALED(status) && WTERMSIG(status) == SIGKILL;
+    found->failed_starts = reached_ready ? 0 : found->failed_starts + (killed ? 0 : 1);
     const std::string who = fmt::format("{} (0x{:04X}, process {})", found->service->name, found->service->pno, pid);
-    if (!reached_ready && found->failures >= kFailuresAtStart) {
+    if (found->failed_starts >= kMostFailedStarts) {
         fmt::print(stderr, "btsvc-sim: {} {} before it served, {} times; mend what it says above and start again\n",
-                   who, how_it_ended(status), found->failures);
+                   who, how_it_ended(status), found->failed_starts);
         return false;
     }
     const auto delay = back_off(found->failures);

@@ -21,7 +21,7 @@ public:
     void start_all() { start(0); }
     bool all_ready() const;
 
-    // A child of the process has died; false when it was a service that cannot be had to run.
+    // A child of the process has died; false when the service cannot be made to start.
     bool reaped(pid_t pid, int status);
     // Bytes or the end have come on a service's ready descriptor. Starts the next service of a unit that comes up.
     void ready_changed(int fd);
@@ -40,7 +40,8 @@ private:
         int ready_fd = -1;
         bool ready = false;
         bool came_up = false; // it was ready at least once
-        int failures = 0; // deaths without having served for a while
+        int failures = 0; // deaths in a row without having served for a while
+        int failed_starts = 0; // deaths in a row before it was ready
         Clock::time_point started{};
         bool waits_for_restart = false;
         Clock::time_point restart_at{};
