@@ -42,7 +42,7 @@ Examples:
   btsvc call --list
   btsvc call CON_requestConnection 00:11:22:33:44:55 0 --wait --timeout 30
   btsvc call BT_SRV_CON_getConnectionMode 00:11:22:33:44:55
-  btsvc call CON_authenticatePinCode 0 00:11:22:33:44:55 text:0000)";
+  btsvc call CON_authenticatePasskey 0 00:11:22:33:44:55 text:123456)";
 
 std::string full_name(const Call& call)
 {

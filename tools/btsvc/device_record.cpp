@@ -39,7 +39,7 @@ nlohmann::ordered_json device_json(const BtConRegDevInfo& device)
     json["address"] = catalogue::address_text(device.bd_addr.address);
     json["name"] = device_name(device);
     json["char_set"] = device.name.char_set;
-    json["class"] = device.device_class;
+    json["class"] = catalogue::id_text(device.device_class);
     json["supported_profiles"] = supported_profiles(device);
     json["connected_profiles"] = connected_profiles(device);
     return json;

@@ -78,7 +78,7 @@ void report_image(const std::string& unit_root, Output& output)
     else
         output.line(fmt::format("\nImage file {}\n{}{}", catalogue::printable(path), verdict.text,
                                 verdict.valid
-                                    ? fmt::format(", {} devices", verdict.devices)
+                                    ? fmt::format(", devices: {}", verdict.devices)
                                     : "; the next start of the connection service replaces it by the defaults"));
 }
 

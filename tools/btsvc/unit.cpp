@@ -12,13 +12,12 @@
 namespace bt::client {
 namespace {
 
-constexpr const char* kRemedy = "start one with `btsvc-sim`, or name its domain with --domain";
+constexpr const char* kRemedy = "`btsvc-sim` starts a simulated unit, --domain names another one";
 
 [[noreturn]] void refuse_domain()
 {
     const std::string reason = bt_host_error();
-    throw Failure(kNoUnit, fmt::format("no unit in domain \"{}\": {}; {}", bt_host_domain(),
-                                       reason.empty() ? "it does not exist" : reason, kRemedy));
+    throw Failure(kNoUnit, fmt::format("{}; {}", reason.empty() ? "the domain cannot be read" : reason, kRemedy));
 }
 
 // Asks with a growing buffer until the whole list fits.
