@@ -1,0 +1,167 @@
+#include "store_support.h"
+
+#include <climits>
+
+using namespace store;
+
+namespace {
+
+// Every device with value 1 under key 5.
+Bytes ids(const std::string& letters)
+{
+    Bytes entries;
+    for (const char letter : letters)
+        entries = entries + id_entry(letter, 5, 1);
+    return id_list(entries);
+}
+
+Row add(const std::string& letter, uint32_t key, uint8_t value, const Bytes& before, const Bytes& after)
+{
+    return change(
+        "add " + letter + " under " + std::to_string(key), before, after,
+        [=](At) { return bt_con_addRegisteredDeviceDIDInfo(dev(letter), key, Given(Bytes(8, value))); }, 0,
+        Locking::kUnlockIgnored);
+}
+
+Row take(const std::string& letter, const std::string& before, const std::string& after, int32_t result = 0)
+{
+    return change(
+        "remove " + letter + " from " + before, ids(before), ids(after),
+        [=](At) { return bt_con_delRegisteredDeviceDIDInfo(dev(letter)); }, result, Locking::kUnlockIgnored);
+}
+
+Row read(const std::string& letter, uint32_t key, int32_t result, Bytes value = {})
+{
+    return answer(
+        "read " + letter + " under " + std::to_string(key),
+        [=](At out) { return bt_con_getRegisteredDeviceDIDInfo(dev(letter), key, out); }, std::move(value), result,
+        Locking::kUnlockIgnored);
+}
+
+} // namespace
+
+TEST(StoreDeviceIds, AddAndRemove)
+{
+    const Bytes one = ids("A"), two = id_list(id_entry('A', 5, 1, 9, 2)), full = ids(kSeventeen);
+    run_rows({add("A", 5, 1, ids(""), one),
+              add("A", 9, 2, one, two),
+              add("A", 7, 3, two, two),
+              add("A", 5, 1, two, two),
+              add("A", 5, 4, two, id_list(id_entry('A', 5, 4, 9, 2))),
+              add("A", 9, 4, two, id_list(id_entry('A', 5, 1, 9, 4))),
+              add("C", 5, 1, ids("AB"), ids("ABC")),
+              add("Q", 5, 1, ids(kSeventeen.substr(0, 16)), full),
+              add("X", 5, 1, full, full),
+              add("A", 0, 1, one, one),
+              add("B", 0, 1, one, one),
+              add("-", 5, 1, one, one),
+              add("0", 5, 1, ids(""), ids("0")),
+              take("A", "ABC", "BC"),
+              take("B", "ABC", "AC"),
+              take("C", "ABC", "AB"),
+              take("A", "A", ""),
+              take("X", "ABC", "ABC", -2),
+              take("X", "", "", -2),
+              take("-", "ABC", "ABC", -2),
+              take("X", kSeventeen, kSeventeen)},
+             {kDeviceIds, 544, ids(""), {}});
+}
+
+TEST(StoreDeviceIds, RemoveFromAFullList)
+{
+    for (const size_t index : {size_t{0}, size_t{15}, size_t{16}}) {
+        uint8_t* const area = attached_process();
+        const Bytes full = ids(kSeventeen);
+        std::copy(full.begin(), full.end(), area + kDeviceIds);
+        EXPECT_EQ(bt_con_delRegisteredDeviceDIDInfo(dev(kSeventeen.substr(index, 1))), 0);
+        Bytes left = area_bytes(kDeviceIds, 544);
+        put(left, 518, {0, 0}); // behind the address of an empty entry anything may stand
+        EXPECT_EQ(difference(left, ids(std::string(kSeventeen).erase(index, 1))), "");
+    }
+}
+
+TEST(StoreDeviceIds, Read)
+{
+    const Bytes full = ids(kSeventeen), one(8, 1), two(8, 2);
+    run_rows({read("A", 5, 0, one), read("A", 9, 0, two), read("A", 8, -1), read("B", 5, -1), read("B", 0, -2),
+              read("X", 5, -2), read("-", 5, -2), read("X", 5, -2).on(full), read("Q", 5, 0, one).on(full)},
+             {kDeviceIds, 0, id_list(id_entry('A', 5, 1, 9, 2) + id_entry('B', 0, 7)), {}});
+}
+
+TEST(StoreDeviceIds, NullPointersAreRefused)
+{
+    uint8_t* const area = attached_process();
+    const Bytes list = ids("A");
+    std::copy(list.begin(), list.end(), area + kDeviceIds);
+    EXPECT_EQ(bt_con_delRegisteredDeviceDIDInfo(nullptr), -2);
+    EXPECT_EQ(bt_con_getRegisteredDeviceDIDInfo(nullptr, 5, Given(Bytes(8))), -2);
+    EXPECT_EQ(bt_con_getRegisteredDeviceDIDInfo(dev("A"), 5, nullptr), -2);
+    EXPECT_EQ(bt_con_addRegisteredDeviceDIDInfo(nullptr, 5, Given(Bytes(8))), 0);
+    EXPECT_EQ(bt_con_addRegisteredDeviceDIDInfo(dev("B"), 5, nullptr), 0);
+    EXPECT_EQ(difference(area_bytes(kDeviceIds, 544), list), "");
+    EXPECT_EQ(fake::held_locks(), 0u);
+}
+
+TEST(StoreDeviceIds, SearchInACallersList)
+{
+    const struct {
+        Bytes list;
+        const char* letter;
+        int32_t result, index;
+    } rows[] = {{ids("ABC"), "A", 0, 0},
+                {ids("ABC"), "C", 0, 2},
+                {ids("ABC"), "X", -2, 3},
+                {ids(""), "X", -2, 0},
+                {ids(kSeventeen), "Q", 0, 16},
+                {ids(kSeventeen), "X", 0, 17},
+                {ids(kSeventeen.substr(1)), "X", -2, 16},
+                {ids("ABC"), "-", -2, 3},
+                {ids("AB-D"), "D", -2, 2}};
+    int32_t index = 77;
+    EXPECT_EQ(bt_con_searchRegisteredDeviceDIDInfo(nullptr, Given(ids("A")), &index), -2);
+    EXPECT_EQ(bt_con_searchRegisteredDeviceDIDInfo(dev("A"), nullptr, &index), -2);
+    EXPECT_EQ(index, 77);
+    EXPECT_EQ(bt_con_searchRegisteredDeviceDIDInfo(dev("A"), Given(ids("A")), nullptr), -2);
+    for (const auto& row : rows) {
+        EXPECT_EQ(bt_con_searchRegisteredDeviceDIDInfo(dev(row.letter), Given(row.list), &index), row.result);
+        EXPECT_EQ(index, row.index);
+    }
+}
+
+TEST(StoreDeviceIds, SlotsOfACallersList)
+{
+    const Bytes a = id_entry('A', 5, 1, 9, 2), b = id_entry('B', 5, 1), c = id_entry('C', 6, 1, 7, 2),
+                list = id_list(a + b + c);
+    const struct {
+        int32_t index;
+        uint32_t key;
+        int32_t read, written;
+        Bytes value, after; // empty: untouched
+    } rows[] = {{0, 5, 0, 0, Bytes(8, 1), id_list(id_entry('X', 5, 3, 9, 2) + b + c)},
+                {0, 9, 0, 0, Bytes(8, 2), id_list(id_entry('X', 5, 1, 9, 3) + b + c)},
+                {1, 9, -1, 0, {}, id_list(a + id_entry('X', 5, 1, 9, 3) + c)},
+                {2, 5, -1, -1, {}, {}},
+                {1, 0, -2, -2, {}, {}},
+                {16, 0, -2, -2, {}, {}},
+                {17, 5, -2, -2, {}, {}},
+                {18, 5, -2, -2, {}, {}},
+                {-1, 5, -2, -2, {}, {}},
+                {INT32_MIN, 5, -2, -2, {}, {}},
+                {INT32_MAX, 5, -2, -2, {}, {}}};
+    for (const auto& row : rows) {
+        SCOPED_TRACE("index " + std::to_string(row.index) + ", key " + std::to_string(row.key));
+        const Given mine(list), value(Bytes(8, 0xA5));
+        EXPECT_EQ(bt_con_getDeviceDIDInfo(row.index, row.key, mine, value), row.read);
+        EXPECT_EQ(value.bytes(), row.value.empty() ? Bytes(8, 0xA5) : row.value);
+        EXPECT_EQ(difference(mine.bytes(), list), "");
+        EXPECT_EQ(bt_con_setDeviceDIDInfo(row.index, dev("X"), row.key, mine, Given(Bytes(8, 3))), row.written);
+        EXPECT_EQ(difference(mine.bytes(), row.after.empty() ? list : row.after), "");
+    }
+    const Given mine(list), value(Bytes(8, 0xA5));
+    EXPECT_EQ(bt_con_getDeviceDIDInfo(0, 5, nullptr, value), -2);
+    EXPECT_EQ(bt_con_getDeviceDIDInfo(0, 5, mine, nullptr), -2);
+    EXPECT_EQ(bt_con_setDeviceDIDInfo(0, nullptr, 5, mine, value), -2);
+    EXPECT_EQ(bt_con_setDeviceDIDInfo(0, dev("X"), 5, nullptr, value), -2);
+    EXPECT_EQ(bt_con_setDeviceDIDInfo(0, dev("X"), 5, mine, nullptr), -2);
+    EXPECT_EQ(difference(mine.bytes(), list), "");
+}
