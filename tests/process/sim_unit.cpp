@@ -23,10 +23,10 @@ int exit_code_of(pid_t pid)
     return WIFSIGNALED(status) ? -WTERMSIG(status) : WEXITSTATUS(status);
 }
 
-void become_unit(const std::string& domain, const std::string& root, int ready_fd)
+void become_unit(const std::string& domain, const std::string& root, const std::string& name, int ready_fd)
 {
     const std::string program = sim_path();
-    const std::string scenario = std::string(BTSVC_SCENARIOS) + "/two_phones.json";
+    const std::string scenario = std::string(BTSVC_SCENARIOS) + "/" + name + ".json";
     const std::string fd = std::to_string(ready_fd);
     execl(program.c_str(), "btsvc-sim", "--scenario", scenario.c_str(), "--domain", domain.c_str(), "--root",
           root.c_str(), "--ready-fd", fd.c_str(), static_cast<char*>(nullptr));
@@ -41,7 +41,7 @@ std::string sim_path()
     return given != nullptr ? given : BTSVC_SIM_PATH;
 }
 
-SimUnit::SimUnit(std::string domain, const std::string& root)
+SimUnit::SimUnit(std::string domain, const std::string& root, const std::string& scenario)
     : domain_(std::move(domain) + "-" + std::to_string(getpid()))
 {
     std::array<int, 2> ready{};
@@ -49,7 +49,7 @@ SimUnit::SimUnit(std::string domain, const std::string& root)
     pid_ = fork();
     if (pid_ == 0) {
         close(ready[0]);
-        become_unit(domain_, root, ready[1]);
+        become_unit(domain_, root, scenario, ready[1]);
     }
     close(ready[1]);
     char text[6] = {};

@@ -17,8 +17,8 @@ std::string sim_path();
 
 class SimUnit {
 public:
-    // Starts a unit and waits until it is ready or has ended.
-    SimUnit(std::string domain, const std::string& root);
+    // Starts a unit with a shipped scenario and waits until it is ready or has ended.
+    SimUnit(std::string domain, const std::string& root, const std::string& scenario = "two_phones");
     ~SimUnit();
     SimUnit(const SimUnit&) = delete;
     SimUnit& operator=(const SimUnit&) = delete;
