@@ -11,8 +11,6 @@
 
 #include <bt_platform/host.h>
 
-#include <sys/stat.h>
-
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
@@ -88,12 +86,6 @@ void forget_domain()
     g_descriptor = -1;
 }
 
-bool still_named(int fd)
-{
-    struct stat file {};
-    return fstat(fd, &file) == 0 && file.st_nlink != 0;
-}
-
 // `absent` when the name is taken, or was taken away while the domain was made.
 Opening make_domain(Object* object)
 {
@@ -107,8 +99,7 @@ Opening make_domain(Object* object)
         fail(-1, "the system has no robust mutexes between processes");
         return Opening::refused;
     }
-    publish(*object);
-    if (still_named(object->fd)) return Opening::done;
+    if (publish(*object)) return Opening::done;
     discard(*object);
     return Opening::absent;
 }
@@ -140,6 +131,7 @@ bool remove_all(DomainArea& area, int descriptor)
     bool removed = true;
     if (still_named(descriptor)) {
         remove_entries(area);
+        remove_leftovers(g_name);
         removed = remove_object(own_object());
     }
     unlock(&area.lock);
@@ -157,14 +149,14 @@ bool remove_all(Object& object)
 int32_t try_to_create()
 {
     Object object;
-    Opening opening = open_finished(&object);
+    Opening opening = open_object(own_object(), Kind::domain, sizeof(DomainArea), &object);
     if (opening == Opening::done && object.stamp->retired.load() == 0) {
         keep(object);
         return 1;
     }
     if (opening == Opening::refused) return -1;
     if (opening == Opening::done && !remove_all(object)) return -1; // a removal that did not get to its end
-    if (opening == Opening::unfinished && !remove_object(own_object())) return -1;
+    if (opening == Opening::unfinished && !remove_unfinished(own_object())) return -1;
 
     opening = make_domain(&object);
     if (opening == Opening::done) {
@@ -286,6 +278,8 @@ int32_t bt_host_remove_domain()
     case Opening::done:
         return remove_all(object) ? 0 : -1;
     default:
-        return remove_object(own_object()) ? 0 : -1;
+        break;
     }
+    remove_leftovers(g_name);
+    return remove_object(own_object()) ? 0 : -1;
 }

@@ -22,7 +22,7 @@ static_assert(sizeof(off_t) == 8, "a process number is an offset of the domain o
 
 std::atomic<uint32_t> g_number{0};
 std::atomic<Ring*> g_ring{nullptr};
-std::atomic<bool> g_from_environment{true}; // until the program claims or releases by itself
+std::atomic<bool> g_from_environment{true}; // until the program claims or releases one in this domain
 pthread_mutex_t g_taking = PTHREAD_MUTEX_INITIALIZER;
 
 struct flock byte_of(uint32_t pno, short type)
@@ -145,6 +145,7 @@ void forget_number()
 {
     g_number.store(0);
     g_ring.store(nullptr);
+    g_from_environment.store(true);
     end_what_depends();
 }
 
@@ -185,7 +186,6 @@ int32_t bt_host_claim_pno(uint32_t pno)
 int32_t bt_host_release_pno()
 {
     const ProcessLock lock;
-    g_from_environment.store(false);
     const uint32_t number = g_number.load();
     Ring* const ring = own_ring();
     if (domain_locked() == nullptr || number == 0 || ring == nullptr || own_ring() != ring)
@@ -196,6 +196,7 @@ int32_t bt_host_release_pno()
     g_number.store(0);
     g_ring.store(nullptr);
     pthread_mutex_unlock(&g_taking);
+    g_from_environment.store(false);
     end_what_depends();
     unlock_number(number);
     return 0;

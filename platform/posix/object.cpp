@@ -2,12 +2,14 @@
 
 #include "error.h"
 
+#include <dirent.h>
 #include <fcntl.h>
 #include <sys/mman.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
 #include <cerrno>
+#include <cstddef>
 #include <cstdio>
 #include <cstring>
 
@@ -93,6 +95,18 @@ bool check_stamp(const ObjectName& name, const Stamp& stamp, Kind kind, uint32_t
     return true;
 }
 
+Opening refuse_size(const ObjectName& name, off_t found, uint32_t wanted)
+{
+    char what[96];
+    const auto bytes = static_cast<long long>(found);
+    if (wanted == 0) {
+        std::snprintf(what, sizeof what, "has an impossible size, %lld bytes", bytes);
+    } else {
+        std::snprintf(what, sizeof what, "has %lld bytes, not %u", bytes, wanted);
+    }
+    return refuse(name, what, "it was made by another version or cut: remove the domain and create it again");
+}
+
 void* map(int fd, uint32_t size)
 {
     void* const address = mmap(nullptr, size, PROT_READ | PROT_WRITE, MAP_SHARED, fd, 0);
@@ -105,25 +119,28 @@ Opening check_and_map(const ObjectName& name, Kind kind, uint32_t size, int fd, 
     if (fstat(fd, &file) != 0) return refuse_call(name, "fstat", errno);
     if (!check_file(name, file)) return Opening::refused;
     if (file.st_size == 0) return Opening::unfinished;
-    if (file.st_size < static_cast<off_t>(sizeof(Stamp)) || file.st_size > INT32_MAX ||
-        (size != 0 && file.st_size != static_cast<off_t>(size))) {
-        char what[96];
-        std::snprintf(what, sizeof what, "has %lld bytes, not %u", static_cast<long long>(file.st_size), size);
-        return refuse(name, what, "it was made by another version or cut: remove the domain and create it again");
-    }
+    if (file.st_size < static_cast<off_t>(sizeof(Stamp)) || file.st_size > INT32_MAX)
+        return refuse_size(name, file.st_size, size);
 
     const auto bytes = static_cast<uint32_t>(file.st_size);
     void* const address = map(fd, bytes);
     if (address == nullptr) return refuse_call(name, "mmap", errno);
 
     auto* const stamp = static_cast<Stamp*>(address);
-    const bool ready = stamp->ready.load(std::memory_order_acquire) == 1;
-    if (ready && check_stamp(name, *stamp, kind, bytes)) {
-        *object = Object{stamp, bytes, fd};
-        return Opening::done;
+    Opening opening = Opening::done;
+    if (stamp->ready.load(std::memory_order_acquire) != 1) {
+        opening = Opening::unfinished;
+    } else if (size != 0 && size != bytes) {
+        opening = refuse_size(name, file.st_size, size);
+    } else if (!check_stamp(name, *stamp, kind, bytes)) {
+        opening = Opening::refused;
     }
-    munmap(address, bytes);
-    return ready ? Opening::refused : Opening::unfinished;
+    if (opening == Opening::done) {
+        *object = Object{stamp, bytes, fd};
+    } else {
+        munmap(address, bytes);
+    }
+    return opening;
 }
 
 // Reserves the memory at once: where it is short the creator gets an error now, not a user a bus error later.
@@ -132,6 +149,21 @@ int reserve(int fd, uint32_t size)
     if (ftruncate(fd, static_cast<off_t>(size)) != 0) return errno;
     const int result = posix_fallocate(fd, 0, static_cast<off_t>(size));
     return result == EOPNOTSUPP || result == EINVAL ? 0 : result;
+}
+
+bool lock_creation(int fd, short type)
+{
+    struct flock lock {};
+    lock.l_type = type;
+    lock.l_whence = SEEK_SET;
+    lock.l_len = 1;
+    return fcntl(fd, F_SETLKW, &lock) == 0;
+}
+
+bool is_ready(int fd)
+{
+    uint32_t ready = 0;
+    return pread(fd, &ready, sizeof ready, offsetof(Stamp, ready)) == sizeof ready && ready == 1;
 }
 
 } // namespace
@@ -178,7 +210,7 @@ Opening create_object(const ObjectName& name, Kind kind, uint32_t size, Object* 
     const int fd = shm_open(name.text, O_RDWR | O_CREAT | O_EXCL, kMode);
     if (fd < 0) return errno == EEXIST ? Opening::absent : refuse_call(name, "shm_open", errno);
 
-    int error = fchmod(fd, kMode) == 0 ? 0 : errno; // whatever the umask is
+    int error = fchmod(fd, kMode) == 0 && lock_creation(fd, F_WRLCK) ? 0 : errno; // whatever the umask is
     if (error == 0) error = reserve(fd, size);
     void* const address = error == 0 ? map(fd, size) : nullptr;
     if (address == nullptr) {
@@ -198,9 +230,32 @@ Opening create_object(const ObjectName& name, Kind kind, uint32_t size, Object* 
     return Opening::done;
 }
 
-void publish(Object& object)
+// The creator holds the first byte's lock from the start to here, so whoever gets it can tell a creator that is dead from
+// one that is slow. One that had not come to the lock yet finds here that it has to start again.
+bool publish(Object& object)
 {
     object.stamp->ready.store(1, std::memory_order_release);
+    const bool named = still_named(object.fd);
+    lock_creation(object.fd, F_UNLCK);
+    return named;
+}
+
+bool remove_unfinished(const ObjectName& name)
+{
+    const int fd = shm_open(name.text, O_RDWR, 0);
+    if (fd < 0) return errno == ENOENT;
+
+    bool settled = lock_creation(fd, F_WRLCK);
+    if (!settled) refuse_call(name, "waiting for its creator", errno);
+    if (settled && !is_ready(fd) && still_named(fd)) settled = remove_object(name);
+    close(fd);
+    return settled;
+}
+
+bool still_named(int fd)
+{
+    struct stat file {};
+    return fstat(fd, &file) == 0 && file.st_nlink != 0;
 }
 
 void discard(Object& object)
@@ -227,6 +282,22 @@ bool remove_object(const ObjectName& name)
     close(fd);
     if (own && shm_unlink(name.text) != 0 && errno != ENOENT) return refuse_call(name, "shm_unlink", errno), false;
     return own;
+}
+
+void remove_leftovers(const char* domain)
+{
+    char prefix[64];
+    const int length = std::snprintf(prefix, sizeof prefix, "bt.%s.", domain);
+    DIR* const folder = opendir("/dev/shm");
+    if (folder == nullptr) return;
+    while (const dirent* const file = readdir(folder)) {
+        if (std::strncmp(file->d_name, prefix, static_cast<size_t>(length)) != 0) continue;
+        if (std::strcmp(file->d_name + length, "domain") == 0) continue;
+        ObjectName name{};
+        if (std::snprintf(name.text, sizeof name.text, "/%s", file->d_name) < static_cast<int>(sizeof name.text))
+            remove_object(name);
+    }
+    closedir(folder);
 }
 
 } // namespace bt::platform

@@ -48,7 +48,16 @@ Opening open_object(const ObjectName& name, Kind kind, uint32_t size, Object* ob
 // Creates an object of `size` zero bytes behind the stamp's fields, for its owner only. The caller fills it and then
 // publishes it. `absent` means that the name is taken.
 Opening create_object(const ObjectName& name, Kind kind, uint32_t size, Object* object);
-void publish(Object& object);
+
+// Marks the object ready. False when its name was taken away meanwhile by remove_unfinished().
+bool publish(Object& object);
+
+// Removes an object that its creator will not finish, since it is dead or has not got far; it creates it again then. True
+// when the name is free or belongs to a finished object now.
+bool remove_unfinished(const ObjectName& name);
+
+// False when the object's name was removed.
+bool still_named(int fd);
 
 // Unmaps and closes; for paths that have not handed the mapping out.
 void discard(Object& object);
@@ -58,5 +67,9 @@ void close_descriptor(Object& object);
 
 // Removes the name of an object that belongs to this user, whatever its state. True when it is gone.
 bool remove_object(const ObjectName& name);
+
+// Removes what is in a domain but not listed by it, where the system shows objects as files (Linux: /dev/shm). The domain
+// object itself is left: it goes last, since nobody can make a new domain before.
+void remove_leftovers(const char* domain);
 
 } // namespace bt::platform

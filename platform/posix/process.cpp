@@ -40,7 +40,7 @@ int32_t _sys_SetupZX44API(uint32_t)
 void _sys_Exit(int32_t code)
 {
     enter_exit_once(code);
-    if (code != 0 && last_error()[0] != '\0') {
+    if (code == -1 && last_error()[0] != '\0') {
         char text[600];
         std::snprintf(text, sizeof text, "the process ends with %d: %s", code, last_error());
         log_last_words(text);
