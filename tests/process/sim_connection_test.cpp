@@ -1,7 +1,6 @@
 // What an application sees of the simulated unit's connection service.
+#ifdef BTSVC_SIM_PATH
 #include "sim_unit.h"
-
-#include "sim/unit_records.h"
 
 #include <bt_platform/host.h>
 #include <gtest/gtest.h>
@@ -35,12 +34,6 @@ const std::vector<uint32_t> kConnectionEvents = {BT_SIM_EVENT_CON_CONNECTION,
                                                  BT_SIM_EVENT_CON_CANCEL_SEARCH,
                                                  BT_SIM_EVENT_CON_TERMINATION_REGISTRATION};
 
-void request_connection(const BtDevAddress& address, uint32_t profile)
-{
-    const BtConParameters parameters = {profile, {}};
-    ASSERT_EQ(0, BT_SRV_CON_requestConnection(&address, &parameters));
-}
-
 uint32_t connect_result(const BtDevAddress& address, uint32_t profile)
 {
     request_connection(address, profile);
@@ -53,47 +46,12 @@ uint32_t disconnect_result(const BtDevAddress& address, uint32_t profile)
     return word(wait_for(BT_SIM_EVENT_CON_DISCONNECTION), 0);
 }
 
-int32_t registered_count()
-{
-    const int32_t from = 0;
-    BtConRegDevInfo records[BT_CON_DEVICE_MAX];
-    return BT_SRV_CON_getRemoteDeviceList(0, &from, BT_CON_DEVICE_MAX, records);
-}
-
-uint32_t connection_mode(const BtDevAddress& address)
-{
-    uint32_t mode = 0;
-    EXPECT_EQ(0, BT_SRV_CON_getConnectionMode(&address, &mode));
-    return mode;
-}
-
 BtConPinCode pin_code(const char* digits)
 {
     BtConPinCode code{};
     code.bytes[0] = static_cast<uint8_t>(std::strlen(digits));
     std::memcpy(code.bytes + 4, digits, std::strlen(digits));
     return code;
-}
-
-// The record that the supervisor keeps about the service at the number.
-BtSimService service_at(uint32_t pno)
-{
-    void* address = nullptr;
-    uint32_t size = sizeof(BtSimUnit);
-    EXPECT_EQ(0, _sys_LinkShareData(kUnitDataName, &address, &size));
-    const auto& unit = *static_cast<const BtSimUnit*>(address);
-    for (uint32_t i = 0; i < unit.service_count; ++i)
-        if (unit.services[i].pno == pno) return unit.services[i];
-    ADD_FAILURE() << "the unit has no such service";
-    return {};
-}
-
-// Kills the service; what is posted to it from then on waits until it is back.
-void kill_connection_service()
-{
-    const auto pid = static_cast<pid_t>(service_at(PNO_BT_CON).pid);
-    ASSERT_GT(pid, 0);
-    ASSERT_EQ(0, kill(pid, SIGKILL));
 }
 
 class SimConnection : public testing::Test {
@@ -258,98 +216,6 @@ TEST_F(SimConnection, KilledServiceComesBackWithItsDevicesAndWithoutConnections)
     });
 }
 
-class SimPairing : public testing::Test {
-protected:
-    TemporaryRoot root_;
-    SimUnit unit_{"sim-pairing", root_.path(), "pairing"};
-};
-
-TEST_F(SimPairing, EachPhoneIsPairedInItsOwnWay)
-{
-    constexpr uint32_t kAgree = 0;
-    constexpr uint32_t kRefuse = 1;
-    struct Row {
-        uint8_t phone;
-        uint32_t prompt; // 0: the phone does not ask
-        void (*reply)(const BtDevAddress& address);
-        uint32_t result;
-    };
-    static const BtConPasskey right = {{'3', '1', '4', '1', '5', '9'}};
-    static const BtConPasskey wrong = {{'3', '1', '4', '1', '5'}};
-    const Row rows[] = {
-        {1, BT_SIM_EVENT_CON_NUMERIC_REQUEST,
-         [](const BtDevAddress& address) { EXPECT_EQ(0, BT_SRV_CON_authenticateNumericValue(kRefuse, &address)); },
-         BT_SIM_REFUSED},
-        {1, BT_SIM_EVENT_CON_NUMERIC_REQUEST,
-         [](const BtDevAddress& address) {
-             EXPECT_EQ(0, BT_SRV_CON_TerminationRegistration());
-             EXPECT_EQ(0, BT_SRV_CON_authenticateNumericValue(kAgree, &address)) << "too late";
-         },
-         BT_SIM_CANCELLED},
-        {1, BT_SIM_EVENT_CON_NUMERIC_REQUEST,
-         [](const BtDevAddress& address) { EXPECT_EQ(0, BT_SRV_CON_cancelConnection(&address, 0)); }, BT_SIM_CANCELLED},
-        {1, BT_SIM_EVENT_CON_NUMERIC_REQUEST, [](const BtDevAddress&) {}, BT_SIM_AUTHENTICATION_FAILED},
-        {1, BT_SIM_EVENT_CON_NUMERIC_REQUEST,
-         [](const BtDevAddress& address) {
-             EXPECT_EQ(0, BT_SRV_CON_authenticatePasskey(kAgree, &address, &right)) << "answers another prompt";
-             EXPECT_EQ(0, BT_SRV_CON_authenticateNumericValue(kAgree, &address));
-         },
-         BT_SIM_OK},
-        {2, BT_SIM_EVENT_CON_PASSKEY_REQUEST,
-         [](const BtDevAddress& address) { EXPECT_EQ(0, BT_SRV_CON_authenticatePasskey(kAgree, &address, &wrong)); },
-         BT_SIM_AUTHENTICATION_FAILED},
-        {2, BT_SIM_EVENT_CON_PASSKEY_REQUEST,
-         [](const BtDevAddress& address) { EXPECT_EQ(0, BT_SRV_CON_authenticatePasskey(kAgree, &address, &right)); },
-         BT_SIM_OK},
-        {3, 0, nullptr, BT_SIM_REFUSED},
-        {4, 0, nullptr, BT_SIM_OUT_OF_RANGE},
-    };
-    ASSERT_TRUE(unit_.ready());
-    as_application(unit_.domain(), [&] {
-        listen_for({BT_SIM_EVENT_CON_CONNECTION, BT_SIM_EVENT_CON_NUMERIC_REQUEST, BT_SIM_EVENT_CON_PASSKEY_REQUEST});
-        for (const Row& row : rows) {
-            SCOPED_TRACE(&row - rows);
-            const BtDevAddress address = device_address(0xA0, row.phone);
-            request_connection(address, 0);
-            if (row.prompt != 0) {
-                EXPECT_EQ(0, std::memcmp(&address, wait_for(row.prompt).payload, sizeof address));
-                row.reply(address);
-            }
-            EXPECT_EQ(row.result, word(wait_for(BT_SIM_EVENT_CON_CONNECTION), 0));
-        }
-        EXPECT_EQ(2, registered_count());
-    });
-}
-
-// The phone asks again after each restart of the service.
-TEST_F(SimPairing, PhoneThatAsksIsConnectedOnlyWhenTheApplicationAccepts)
-{
-    struct Row {
-        uint32_t first;
-        BtConProfileFilterBlock filter;
-        uint32_t result;
-    };
-    const Row rows[] = {{1, {}, BT_SIM_REFUSED}, {0, {1, {0}}, BT_SIM_REFUSED}, {0, {2, {0, 1}}, BT_SIM_OK}};
-    const BtDevAddress caller = device_address(0xA0, 5);
-    ASSERT_TRUE(unit_.ready());
-    as_application(unit_.domain(), [&] {
-        listen_for({BT_SIM_EVENT_CON_CONNECTION_INDICATION, BT_SIM_EVENT_CON_ACCEPT_CONNECTION,
-                    BT_SIM_EVENT_CON_CANCEL_SEARCH});
-        for (const Row& row : rows) {
-            SCOPED_TRACE(&row - rows);
-            kill_connection_service();
-            ASSERT_EQ(0, BT_SRV_CON_cancelSearch());
-            wait_for(BT_SIM_EVENT_CON_CANCEL_SEARCH);
-            EXPECT_EQ(1U, word(wait_for(BT_SIM_EVENT_CON_CONNECTION_INDICATION), 8));
-            ASSERT_EQ(0, BT_SRV_CON_acceptConnection(row.first, &caller, &row.filter));
-            EXPECT_EQ(row.result, word(wait_for(BT_SIM_EVENT_CON_ACCEPT_CONNECTION), 0));
-            ASSERT_EQ(0, BT_SRV_CON_acceptConnection(0, &caller, nullptr));
-            EXPECT_EQ(BT_SIM_NOT_EXPECTED, word(wait_for(BT_SIM_EVENT_CON_ACCEPT_CONNECTION), 0));
-        }
-        EXPECT_EQ(1U, connection_mode(caller));
-    });
-}
-
 // A message as anybody may post it; `length` is what its header says, whatever is really sent.
 void post_raw(uint32_t cid, uint16_t length)
 {
@@ -385,3 +251,5 @@ TEST_F(SimConnection, MessagesOfAnyLengthAreAnsweredOrDroppedAndHarmNothing)
 
 } // namespace
 } // namespace bt::test
+
+#endif

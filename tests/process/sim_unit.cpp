@@ -4,6 +4,7 @@
 #include <gtest/gtest.h>
 
 #include <array>
+#include <csignal>
 #include <cstdlib>
 #include <cstring>
 #include <filesystem>
@@ -151,6 +152,45 @@ uint32_t word(const BtMessage& event, size_t offset)
 BtDevAddress device_address(uint8_t first, uint8_t last)
 {
     return {{first, 0, 0, 0, 0, last}, {0, 0}};
+}
+
+void request_connection(const BtDevAddress& address, uint32_t profile)
+{
+    const BtConParameters parameters = {profile, {}};
+    ASSERT_EQ(0, BT_SRV_CON_requestConnection(&address, &parameters));
+}
+
+int32_t registered_count()
+{
+    const int32_t from = 0;
+    BtConRegDevInfo records[BT_CON_DEVICE_MAX];
+    return BT_SRV_CON_getRemoteDeviceList(0, &from, BT_CON_DEVICE_MAX, records);
+}
+
+uint32_t connection_mode(const BtDevAddress& address)
+{
+    uint32_t mode = 0;
+    EXPECT_EQ(0, BT_SRV_CON_getConnectionMode(&address, &mode));
+    return mode;
+}
+
+BtSimService service_at(uint32_t pno)
+{
+    void* address = nullptr;
+    uint32_t size = sizeof(BtSimUnit);
+    EXPECT_EQ(0, _sys_LinkShareData(kUnitDataName, &address, &size));
+    const auto& unit = *static_cast<const BtSimUnit*>(address);
+    for (uint32_t i = 0; i < unit.service_count; ++i)
+        if (unit.services[i].pno == pno) return unit.services[i];
+    ADD_FAILURE() << "the unit has no such service";
+    return {};
+}
+
+void kill_connection_service()
+{
+    const auto pid = static_cast<pid_t>(service_at(PNO_BT_CON).pid);
+    ASSERT_GT(pid, 0);
+    ASSERT_EQ(0, kill(pid, SIGKILL));
 }
 
 } // namespace bt::test

@@ -2,6 +2,8 @@
 // each test may use several domains; the test's own process never touches the platform layer.
 #pragma once
 
+#include "sim/unit_records.h"
+
 #include <bt_service/bt_service.h>
 #include <bt_sim/events.h>
 
@@ -63,5 +65,14 @@ BtMessage wait_for(uint32_t event_id);
 uint32_t word(const BtMessage& event, size_t offset);
 
 BtDevAddress device_address(uint8_t first, uint8_t last);
+
+void request_connection(const BtDevAddress& address, uint32_t profile);
+int32_t registered_count();
+uint32_t connection_mode(const BtDevAddress& address);
+
+// The record that the supervisor keeps about the service at the number.
+BtSimService service_at(uint32_t pno);
+// Kills the service; what is posted to it from then on waits until it is back.
+void kill_connection_service();
 
 } // namespace bt::test

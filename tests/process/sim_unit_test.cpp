@@ -1,7 +1,6 @@
 // The simulated unit as a whole: its domain, its end, its scenario, and the delivery of events.
+#ifdef BTSVC_SIM_PATH
 #include "sim_unit.h"
-
-#include "sim/unit_records.h"
 
 #include <bt_platform/host.h>
 #include <gmock/gmock.h>
@@ -212,3 +211,5 @@ TEST(SimScenario, WrongFileIsRefusedWithPlaceAndRemedy)
 
 } // namespace
 } // namespace bt::test
+
+#endif
