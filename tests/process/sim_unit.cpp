@@ -34,6 +34,13 @@ void become_unit(const std::string& domain, const std::string& root, const std::
     _exit(126);
 }
 
+// Tells the domains of one run of the tests from those of another; applications inherit it.
+const std::string& run_name()
+{
+    static const std::string name = std::to_string(getpid());
+    return name;
+}
+
 } // namespace
 
 std::string sim_path()
@@ -43,7 +50,7 @@ std::string sim_path()
 }
 
 SimUnit::SimUnit(std::string domain, const std::string& root, const std::string& scenario)
-    : domain_(std::move(domain) + "-" + std::to_string(getpid()))
+    : domain_(std::move(domain) + "-" + run_name())
 {
     std::array<int, 2> ready{};
     if (pipe(ready.data()) != 0) return;

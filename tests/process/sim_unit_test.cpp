@@ -9,6 +9,7 @@
 #include <csignal>
 #include <cstdio>
 #include <fstream>
+#include <memory>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -87,6 +88,23 @@ TEST(SimUnit, DomainOfADeadUnitIsTakenOver)
     SimUnit next("sim-dead", root.path());
     ASSERT_TRUE(next.ready());
     as_application(next.domain(), expect_service_works);
+}
+
+TEST(SimUnit, ApplicationThatOutlivesItsUnitGoesOnWithTheNextOne)
+{
+    TemporaryRoot root;
+    SimUnit dead("sim-outlived", root.path());
+    ASSERT_TRUE(dead.ready());
+    as_application(dead.domain(), [&] {
+        expect_service_works();
+        dead.send_signal(SIGKILL);
+        // The domain is taken until the kernel has removed the dead unit.
+        auto next = std::make_unique<SimUnit>("sim-outlived", root.path());
+        while (!next->ready() && next->wait_for_end() == kDomainTaken)
+            next = std::make_unique<SimUnit>("sim-outlived", root.path());
+        ASSERT_TRUE(next->ready());
+        expect_service_works();
+    });
 }
 
 TEST(SimUnit, SuspendedListenerGetsNothingUntilItIsResumed)
