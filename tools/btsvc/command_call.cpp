@@ -71,7 +71,7 @@ const char* meaning_of(int32_t result)
     case BT_FAILED:
         return "failed, not posted or not found";
     case BT_BAD_ARGUMENT:
-        return "bad argument";
+        return "bad argument or unknown device";
     case BT_NO_SEMAPHORE:
         return "lock not available";
     case BT_NOT_POSTED:
@@ -192,12 +192,12 @@ Command add_call(CLI::App& program)
     CLI::App* line = program.add_subcommand("call", "Call a request or query by its exported name");
     line->footer(kFooter);
     line->add_option("function", options->words, "Name, with or without BT_SRV_, and its arguments")
-        ->type_name("NAME ARG...");
+        ->type_name("NAME ARG");
     line->add_flag("--list", options->list, "List the functions with their arguments");
     line->add_flag("--wait", options->wait, "Wait for the answer and print it");
     line->add_option("--timeout", options->timeout, "Seconds to wait for the answer")
         ->type_name("SECONDS")
-        ->check(CLI::PositiveNumber)
+        ->check(CLI::Range(kShortestTimeout, kLongestTimeout).description(""))
         ->capture_default_str();
     return {line, [options](Output& output) { return run_call(*options, output); }};
 }

@@ -84,10 +84,12 @@ Command add_listen(CLI::App& program)
     line->footer(kFooter);
     line->add_option("events", options->events, "Names or ids of events")->type_name("EVENT");
     line->add_flag("--all-connection", options->all_connection, "All events of the connection service");
-    line->add_option("--count", options->count, "End after N events")->type_name("N")->check(CLI::PositiveNumber);
+    line->add_option("--count", options->count, "End after N events")
+        ->type_name("N")
+        ->check(CLI::Range(uint64_t{1}, uint64_t{1000000000}).description(""));
     line->add_option("--timeout", options->timeout, "End after so many seconds")
         ->type_name("SECONDS")
-        ->check(CLI::PositiveNumber);
+        ->check(CLI::Range(kShortestTimeout, kLongestTimeout).description(""));
     return {line, [options](Output& output) { return run_listen(*options, output); }};
 }
 

@@ -17,6 +17,9 @@ bool stop_requested();
 using Clock = std::chrono::steady_clock;
 using Deadline = std::optional<Clock::time_point>; // empty: no limit
 
+constexpr double kShortestTimeout = 0.001; // seconds
+constexpr double kLongestTimeout = 1e9;
+
 // So many seconds from now; 0 means no limit.
 Deadline time_limit(double seconds);
 

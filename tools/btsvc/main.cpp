@@ -8,6 +8,9 @@
 #include <string>
 #include <vector>
 
+#include <fcntl.h>
+#include <unistd.h>
+
 namespace {
 
 using namespace bt::client;
@@ -26,6 +29,29 @@ unit's absolute paths.
 
 Exit codes: 0 done; 1 the call was refused or its answer was negative; 2 usage; 3 no unit in the domain, or its
 platform layer is unusable; 4 timed out; 5 the output could not be written; 6 interrupted by a signal.)";
+
+// A standard descriptor that is closed would be taken by the next file or shared object opened, and output would go
+// there. The stand-in cannot be written, so that output fails as it should.
+void occupy_standard_descriptors()
+{
+    for (int fd = STDIN_FILENO; fd <= STDERR_FILENO; ++fd)
+        if (::fcntl(fd, F_GETFD) < 0) ::open("/dev/null", O_RDONLY);
+}
+
+std::string failure_text(const CLI::App* program, const CLI::Error& error)
+{
+    const std::vector<std::string> unknown = program->remaining();
+    const bool no_command = program->get_subcommands().empty() && !unknown.empty();
+    return "btsvc: " + (no_command ? "\"" + unknown.front() + "\" is no command" : std::string(error.what())) +
+           "; see `btsvc --help`\n";
+}
+
+void describe_global_options(CLI::App& line)
+{
+    line.footer(line.get_footer() +
+                "\n\n--json, --domain NAME and --root DIR may stand before or behind the command; see "
+                "`btsvc --help`.");
+}
 
 struct GlobalOptions {
     bool json = false;
@@ -58,11 +84,13 @@ ExitCode run(CLI::App& program, const std::vector<Command>& commands, const Glob
 
 int main(int argc, char** argv)
 {
+    occupy_standard_descriptors();
     std::signal(SIGPIPE, SIG_IGN);
 
     CLI::App program(kDescription, "btsvc");
     program.footer(kFooter);
     program.require_subcommand(1);
+    program.failure_message(failure_text);
     program.set_version_flag("--version", BTSVC_VERSION);
 
     GlobalOptions options;
@@ -73,6 +101,6 @@ int main(int argc, char** argv)
     const std::vector<Command> commands{add_devices(program), add_listen(program), add_call(program),
                                         add_status(program)};
     for (const Command& command : commands)
-        command.line->fallthrough();
+        describe_global_options(*command.line->fallthrough());
     return run(program, commands, options, argc, argv);
 }
