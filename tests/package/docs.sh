@@ -19,7 +19,7 @@ for document in README.md CONTRIBUTING.md docs/*.md; do
 done
 [ "$links" -ge 10 ] || { echo "only $links links found"; status=1; }
 
-for command in $(grep -ohE '\bscripts/[a-z]+' README.md CONTRIBUTING.md docs/*.md | sort -u); do
+for command in $(grep -ohE '\bscripts/[a-z]+(\.txt)?' README.md CONTRIBUTING.md docs/*.md | sort -u); do
   [ -f "$command" ] || { echo "$command is named in the documents and does not exist"; status=1; }
 done
 for script in demo test setup check size layout format; do

@@ -12,10 +12,10 @@ if ! difference=$(diff <(list) <(exported)); then
   exit 1
 fi
 
-status=0
-headers=$(cat "$source_dir"/include/bt_service/*.h)
-while read -r name; do
-  grep -qE "\b$name\b" <<<"$headers" || { echo "$name is exported but no public header declares it"; status=1; }
-done < <(list)
+undeclared=$(comm -23 <(list) <(grep -ohE '\b[A-Za-z_][A-Za-z_0-9]*\b' "$source_dir"/include/bt_service/*.h | sort -u))
+if [ -n "$undeclared" ]; then
+  echo "exported, but no public header declares:"
+  echo "$undeclared"
+  exit 1
+fi
 echo "$(exported | wc -l) exported names"
-exit $status

@@ -1,5 +1,4 @@
 // What an application sees of the simulated unit's connection service.
-#ifdef BTSVC_SIM_PATH
 #include "sim_unit.h"
 
 #include <bt_platform/host.h>
@@ -251,5 +250,3 @@ TEST_F(SimConnection, MessagesOfAnyLengthAreAnsweredOrDroppedAndHarmNothing)
 
 } // namespace
 } // namespace bt::test
-
-#endif

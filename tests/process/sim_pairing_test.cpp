@@ -1,5 +1,4 @@
 // The ways of pairing, and phones that ask for a connection by themselves.
-#ifdef BTSVC_SIM_PATH
 #include "sim_unit.h"
 
 #include <gtest/gtest.h>
@@ -103,5 +102,3 @@ TEST_F(SimPairing, PhoneThatAsksIsConnectedOnlyWhenTheApplicationAccepts)
 
 } // namespace
 } // namespace bt::test
-
-#endif

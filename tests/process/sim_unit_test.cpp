@@ -1,5 +1,4 @@
 // The simulated unit as a whole: its domain, its end, its scenario, and the delivery of events.
-#ifdef BTSVC_SIM_PATH
 #include "sim_unit.h"
 
 #include <bt_platform/host.h>
@@ -229,5 +228,3 @@ TEST(SimScenario, WrongFileIsRefusedWithPlaceAndRemedy)
 
 } // namespace
 } // namespace bt::test
-
-#endif
