@@ -9,6 +9,7 @@
 #include <fmt/format.h>
 
 #include <algorithm>
+#include <cstdio>
 #include <memory>
 
 namespace bt::client {
@@ -43,6 +44,8 @@ ExitCode run_devices(Output& output)
         table.add(std::move(record));
     }
     table.print(output, "", "no device is registered");
+    if (!process_alive(PNO_BT_CON))
+        std::fputs("btsvc: note: no live connection process keeps this list; see `btsvc status`\n", stderr);
     return kDone;
 }
 

@@ -7,6 +7,7 @@
 
 #include <fmt/format.h>
 
+#include <algorithm>
 #include <cstdlib>
 
 namespace bt::client {
@@ -60,10 +61,16 @@ void require_domain()
     queues();
 }
 
+bool process_alive(uint16_t pno)
+{
+    const std::vector<BtHostQueue> known = queues();
+    return std::any_of(known.begin(), known.end(),
+                       [pno](const BtHostQueue& queue) { return queue.pno == pno && queue.owner_pid != 0; });
+}
+
 void require_process(uint16_t pno)
 {
-    for (const BtHostQueue& queue : queues())
-        if (queue.pno == pno && queue.owner_pid != 0) return;
+    if (process_alive(pno)) return;
     throw Failure(kNoUnit, fmt::format("no live {} process (number 0x{:04X}) in domain \"{}\"; {}", process_name(pno),
                                        pno, bt_host_domain(), kRemedy));
 }

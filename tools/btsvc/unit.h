@@ -20,6 +20,8 @@ std::vector<BtHostData> shared_data();
 // Throws Failure(kNoUnit) unless the domain exists.
 void require_domain();
 
+bool process_alive(uint16_t pno);
+
 // Throws Failure(kNoUnit) unless a live process owns the number.
 void require_process(uint16_t pno);
 
