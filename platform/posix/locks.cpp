@@ -106,13 +106,15 @@ void note_holder(LockSlot& slot)
     slot.holder_pid.store(own_pid(), std::memory_order_relaxed);
 }
 
-// Before the release: afterwards the next holder may have written its own.
-void erase_holder(LockSlot& slot)
+// False when the calling thread does not hold it. The mark goes before the release: afterwards the next holder may have
+// written its own.
+bool erase_holder(LockSlot& slot)
 {
-    if (slot.holder_pid.load(std::memory_order_relaxed) != own_pid()) return;
-    if (slot.holder_thread.load(std::memory_order_relaxed) != this_thread()) return;
+    if (slot.holder_pid.load(std::memory_order_relaxed) != own_pid()) return false;
+    if (slot.holder_thread.load(std::memory_order_relaxed) != this_thread()) return false;
     slot.holder_thread.store(0, std::memory_order_relaxed);
     slot.holder_pid.store(0, std::memory_order_relaxed);
+    return true;
 }
 
 } // namespace
@@ -171,6 +173,6 @@ int32_t _sys_SemUnlock(uint32_t handle)
     Handle* const known = known_handle(handle);
     if (known == nullptr) return kUnknown;
     LockSlot* const slot = known->slot.load(std::memory_order_acquire);
-    erase_holder(*slot);
-    return unlock(&slot->mutex) ? 0 : fail(kNotHeld, "this thread does not hold lock \"%s\"", known->name);
+    if (erase_holder(*slot) && unlock(&slot->mutex)) return 0;
+    return fail(kNotHeld, "this thread does not hold lock \"%s\"", known->name);
 }
