@@ -24,6 +24,13 @@ bool process_lives(uint32_t pid)
     return pid != 0 && (::kill(static_cast<pid_t>(pid), 0) == 0 || errno == EPERM);
 }
 
+bool owns_number(const std::vector<BtHostQueue>& known, const BtSimService& service)
+{
+    return service.pid != 0 && std::any_of(known.begin(), known.end(), [&service](const BtHostQueue& queue) {
+               return queue.pno == service.pno && queue.owner_pid == service.pid;
+           });
+}
+
 void print_unit(const BtSimUnit* unit, const std::string& root, Output& output)
 {
     const bool lives = unit != nullptr && process_lives(unit->supervisor_pid);
@@ -53,13 +60,14 @@ std::string report_services(Output& output)
 
     Table table("service",
                 {{"pno", "number"}, {"name", "service"}, {"pid", "process"}, {"alive", "alive"}, {"starts", "starts"}});
+    const std::vector<BtHostQueue> known = queues();
     const size_t count = std::min<size_t>(unit->service_count, std::size(unit->services));
     for (size_t i = 0; i < count; ++i) {
         const BtSimService& service = unit->services[i];
         table.add({{"pno", catalogue::id_text(service.pno)},
                    {"name", bounded_text(service.name)},
                    {"pid", service.pid == 0 ? Json() : Json(service.pid)},
-                   {"alive", process_lives(service.pid)},
+                   {"alive", owns_number(known, service)},
                    {"starts", service.starts}});
     }
     table.print(output, "\nServices", "none");
