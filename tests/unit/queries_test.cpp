@@ -22,11 +22,6 @@ Bytes word(uint32_t value)
     return words({value}) + Bytes(4, 0xA5);
 }
 
-Row query(const std::string& what, Call call, int32_t result, Bytes out = {})
-{
-    return answer(what, std::move(call), std::move(out), result, result == -2 ? Locking::kNone : Locking::kReported);
-}
-
 Call list_call(int32_t value, int32_t maximum)
 {
     return [=](At out) { return BT_SRV_CON_getRemoteDeviceList(7, &value, maximum, out); };
@@ -53,25 +48,22 @@ TEST(ConnectionQueries, OneDevice)
         return [=](At out) { return BT_SRV_CON_getRemoteDeviceInfo(dev(letter), out); };
     };
     const Bytes full = device_list(kSeventeen);
-    run_query_rows({query("mode", mode("B"), 0, word(0x242)), query("mode of an unknown", mode("X"), -1),
-                    query("mode of no device", mode("-"), -1),
-                    query(
-                        "mode, null address", [](At out) { return BT_SRV_CON_getConnectionMode(nullptr, out); }, -1),
-                    query(
-                        "mode, null output", [](At) { return BT_SRV_CON_getConnectionMode(dev("B"), nullptr); }, -2),
-                    query("role", role("C"), 0, word(0x343)), query("role of an unknown", role("X"), -1),
-                    query(
-                        "role, null address", [](At out) { return BT_SRV_CON_getLocalDeviceRole(nullptr, out); }, -1),
-                    query(
-                        "role, null output", [](At) { return BT_SRV_CON_getLocalDeviceRole(dev("B"), nullptr); }, -2),
-                    query("info", info("A"), 0, device_record('A')), query("info of an unknown", info("X"), -1),
-                    query(
-                        "info, null address", [](At out) { return BT_SRV_CON_getRemoteDeviceInfo(nullptr, out); }, -2),
-                    query(
-                        "info, null output", [](At) { return BT_SRV_CON_getRemoteDeviceInfo(dev("A"), nullptr); }, -2),
-                    query("mode, count too large", mode("Q"), 0, word(0x251)).on(with_count(INT32_MAX, full)),
-                    query("info, negative count", info("A"), -1, Bytes(1008, 0xA5)).on(with_count(-1, full))},
-                   kList);
+    run_query_rows(
+        {answer("mode", mode("B"), word(0x242), 0, Locking::kReported),
+         refused("mode of an unknown", -1, mode("X"), Locking::kReported),
+         refused("mode of no device", -1, mode("-"), Locking::kReported),
+         refused("mode, null address", -1, mode("?"), Locking::kReported),
+         refused("mode, null output", -2, nulled(mode("B"))),
+         answer("role", role("C"), word(0x343), 0, Locking::kReported),
+         refused("role of an unknown", -1, role("X"), Locking::kReported),
+         refused("role, null address", -1, role("?"), Locking::kReported),
+         refused("role, null output", -2, nulled(role("B"))),
+         answer("info", info("A"), device_record('A'), 0, Locking::kReported),
+         refused("info of an unknown", -1, info("X"), Locking::kReported), refused("info, null address", -2, info("?")),
+         refused("info, null output", -2, nulled(info("A"))),
+         answer("mode, count too large", mode("Q"), word(0x251), 0, Locking::kReported).on(with_count(INT32_MAX, full)),
+         answer("info, negative count", info("A"), Bytes(1008, 0xA5), -1, Locking::kReported).on(with_count(-1, full))},
+        kList);
 }
 
 TEST(ConnectionQueries, DeviceList)
@@ -86,7 +78,7 @@ TEST(ConnectionQueries, DeviceList)
                             list_call(INT32_MIN, 5),
                             list_call(0, -1),
                             list_call(0, INT32_MIN),
-                            [](At) { return list_call(0, 5)(nullptr); },
+                            nulled(list_call(0, 5)),
                             [](At out) { return BT_SRV_CON_getRemoteDeviceList(7, nullptr, 5, out); }};
     for (const Call& call : refused) {
         fresh_process(device_list("AB"));
@@ -103,10 +95,7 @@ TEST(ConnectionQueries, ModesOfTheRadio)
     const Call scan = [](At out) { return BT_SRV_CON_getScanMode(out); };
     run_query_rows({answer("discoverable", discoverable, word(0xD1), 0, Locking::kAccessor),
                     answer("scan", scan, word(0x5C), 0, Locking::kAccessor),
-                    query(
-                        "discoverable, null", [=](At) { return discoverable(nullptr); }, -2),
-                    query(
-                        "scan, null", [=](At) { return scan(nullptr); }, -2)},
+                    refused("discoverable, null", -2, nulled(discoverable)), refused("scan, null", -2, nulled(scan))},
                    {27776, 0, words({0xD1, 0x5C}), {}});
 }
 
@@ -118,11 +107,8 @@ TEST(ConnectionQueries, DeviceIds)
                       key == 0 ? Locking::kNone : Locking::kUnlockIgnored);
     };
     run_query_rows({id("A", 5, 0, Bytes(8, 1)), id("A", 9, 0, Bytes(8, 2)), id("A", 8, -1), id("X", 5, -2),
-                    id("A", 0, -2),
-                    query(
-                        "null address", [](At out) { return BT_SRV_CON_getRemoteDeviceDIDInfo(nullptr, 5, out); }, -2),
-                    query(
-                        "null output", [](At) { return BT_SRV_CON_getRemoteDeviceDIDInfo(dev("A"), 5, nullptr); }, -2)},
+                    id("A", 0, -2), refused("null address", -2, id("?", 5, -2).call),
+                    refused("null output", -2, nulled(id("A", 5, 0).call))},
                    {kDeviceIds, 0, id_list(id_entry('A', 5, 1, 9, 2)), {}});
 }
 

@@ -43,15 +43,6 @@ const struct Accessor {
     {call<bt_con_getBluetoothSetVal>, call<bt_con_setBluetoothSetVal>, 27792, 4, false},
 };
 
-// An attached process whose area tells every byte from its neighbours.
-Bytes attach_numbered()
-{
-    uint8_t* const area = attached_process();
-    for (size_t i = 0; i < kAreaSize; ++i)
-        area[i] = static_cast<uint8_t>(i * 7 + i / 256);
-    return area_bytes();
-}
-
 Calls calls_of(const std::function<void()>& body)
 {
     const auto before = static_cast<ptrdiff_t>(fake::calls().size());
@@ -127,115 +118,72 @@ TEST(StoreLock, PassesCodesOnAndReleasesAFailedLockOnce)
     EXPECT_EQ(calls_of([] { EXPECT_EQ(bt_con_semUnlock(), fake::kUnlockFailure); }), Calls{"SemUnlock"});
 }
 
-TEST(StoreAccessors, GetCopiesExactlyItsField)
+TEST(StoreAccessors, CopyExactlyTheirFieldAndWriteTheImageOnChangeOnly)
 {
-    for (const Accessor& row : kAccessors) {
-        SCOPED_TRACE("field at " + std::to_string(row.at));
-        const Bytes area = attach_numbered(), field = area_bytes(row.at, row.size);
-        const auto get = [&](uint32_t flag, int32_t result, const Bytes& want) {
-            uint8_t* const out = fake::guarded(static_cast<uint32_t>(row.size));
-            EXPECT_EQ(row.get(out, flag), result);
-            EXPECT_EQ(difference(Bytes(out, out + row.size), want), "");
-            EXPECT_EQ(fake::held_locks(), 0u);
+    for (const Accessor& accessor : kAccessors) {
+        SCOPED_TRACE("field at " + std::to_string(accessor.at));
+        Bytes usual(accessor.size);
+        for (size_t i = 0; i < usual.size(); ++i)
+            usual[i] = static_cast<uint8_t>(i * 7 + i / 256);
+        Bytes first = usual, last = usual;
+        first.front() ^= 0x80;
+        last.back() ^= 0x80;
+        std::vector<Row> rows;
+        for (const uint32_t flag : {0u, 1u, 2u}) {
+            const Locking locking = flag == 1 ? Locking::kAccessor : Locking::kNone;
+            const std::string with = " with flag " + std::to_string(flag);
+            const auto set = [&](const Bytes& after, Locking locks) {
+                const Call call = [=](At) { return accessor.set(static_cast<void*>(Given(after)), flag); };
+                rows.push_back(change("set" + with, usual, after, call, 0, locks));
+                rows.back().writes_image = accessor.writes_image;
+            };
+            const Call get = [=](At out) { return accessor.get(out, flag); };
+            rows.push_back(answer("get" + with, get, usual.size() < 8 ? usual + Bytes(4, 0xA5) : usual, 0, locking));
+            rows.push_back(refused("get into null" + with, -1, nulled(get)));
+            rows.push_back(refused("set null" + with, -1, [=](At) { return accessor.set(At(nullptr), flag); }));
+            set(first, locking);
+            set(last, locking);
+            set(usual, Locking::kNone);
+        }
+        run_rows(rows, {accessor.at, accessor.size, usual, {}});
+    }
+}
+
+TEST(StoreGetterAndSetter, PassCodesOnAndRefuseWhatTheyCannotCopy)
+{
+    const Bytes usual = order_list("AB"), other = order_list("BA");
+    const auto get = [](size_t at, uint32_t size, uint32_t flag) -> Call {
+        return [=](At out) { return bt_con_getter(fake::find_area(kAreaName) + at, out, size, flag); };
+    };
+    const auto set = [&](const Bytes& given, uint32_t size, uint32_t write_from, uint32_t flag) -> Call {
+        return [=](At) {
+            return bt_con_setter(fake::find_area(kAreaName) + kOrder, Given(given), size, write_from, flag);
         };
-        for (const uint32_t flag : {0u, 1u, 2u})
-            EXPECT_EQ(calls_of([&] { get(flag, 0, field); }), flag == 1 ? kLocked : Calls{});
-        EXPECT_EQ(row.get(nullptr, 0), -1);
-        fake::fail_nth(1);
-        get(1, -1, Bytes(row.size, 0xA5));
-        fake::fail_nth(2);
-        get(1, -1, field);
-        set_handle(handle_semaphore(), nullptr);
-        get(0, -1, Bytes(row.size, 0xA5));
-        EXPECT_EQ(difference(area_bytes(), area), "");
+    };
+    std::vector<Row> rows = {
+        answer("get", get(kOrder, 140, 1), usual, 0, Locking::kGeneric),
+        answer("get with flag 2", get(kOrder, 140, 2), usual),
+        answer("get some", get(kOrder + 4, 8, 0), address('A') + Bytes(2, 0x70)),
+        refused("get nothing", -1, get(kOrder, 0, 1)),
+        refused("get into null", -1, nulled(get(kOrder, 140, 1))),
+        refused("get from null", -1, [](At out) { return bt_con_getter(nullptr, out, 8, 1); }),
+        refused("set nothing", -1, set(other, 0, 1, 1)),
+        refused("set null", -1, set({}, 140, 1, 1)),
+        refused("set in null", -1, [](At) { return bt_con_setter(nullptr, Given(Bytes(8)), 8, 1, 1); }),
+        change("set", usual, other, set(other, 140, 1, 1), 0, Locking::kGeneric),
+        change("set with flag 2", usual, other, set(other, 140, 1, 2), 0, Locking::kNone),
+    };
+    for (const uint32_t write_from : {0u, 2u}) {
+        rows.push_back(
+            change("set for the area alone", usual, other, set(other, 140, write_from, 1), 0, Locking::kGeneric));
+        rows.back().writes_image = false;
     }
-}
+    run_rows(rows, {kOrder, 140, usual, {}});
 
-TEST(StoreAccessors, SetChangesExactlyItsFieldAndWritesTheImageOnChangeOnly)
-{
-    for (const Accessor& row : kAccessors)
-        for (const uint32_t flag : {0u, 1u, 2u})
-            for (const size_t changed : {size_t{0}, row.size - 1, row.size}) {
-                SCOPED_TRACE("field at " + std::to_string(row.at) + ", byte " + std::to_string(changed));
-                Bytes want = attach_numbered();
-                uint8_t* const value = fake::guarded(static_cast<uint32_t>(row.size));
-                std::memcpy(value, want.data() + row.at, row.size);
-                const bool differs = changed < row.size;
-                if (differs) want[row.at + changed] = value[changed] ^= 0x80;
-
-                EXPECT_EQ(calls_of([&] { EXPECT_EQ(row.set(value, flag), 0); }),
-                          differs && flag == 1 ? kLocked : Calls{});
-                EXPECT_EQ(difference(area_bytes(), want), "");
-                const bool writes = row.writes_image && differs;
-                EXPECT_EQ(difference(*fake::read_file(kImagePath), writes ? image_of(want) : stale_image()), "");
-            }
-}
-
-TEST(StoreAccessors, SetReportsEveryFailureAsMinusOneButThatOfTheImage)
-{
-    for (const Accessor& row : kAccessors) {
-        SCOPED_TRACE("field at " + std::to_string(row.at));
-        const Bytes area = attach_numbered(), value(row.size, 0xC3);
-        const auto set = [&](const Bytes& bytes, uint32_t failing, int32_t result) {
-            fake::fail_nth(failing);
-            EXPECT_EQ(row.set(static_cast<uint8_t*>(Given(bytes)), 1), result);
-        };
-        EXPECT_EQ(row.set(nullptr, 1), -1);
-        set(value, 1, -1);
-        EXPECT_EQ(difference(area_bytes(), area), "");
-        set(value, 2, -1);
-        EXPECT_EQ(difference(area_bytes(row.at, row.size), value), "");
-        EXPECT_EQ(difference(*fake::read_file(kImagePath), stale_image()), "");
-        EXPECT_EQ(fake::held_locks(), 0u);
-        EXPECT_EQ(fake::stray_unlocks(), 1u);
-
-        fake::remove_file(kImagePath);
-        set(Bytes(row.size, 0x3C), 0, 0);
-        set_handle(handle_semaphore(), nullptr);
-        set(value, 0, -1);
-        EXPECT_EQ(area_bytes(row.at, row.size), Bytes(row.size, 0x3C));
-    }
-}
-
-TEST(StoreGetterAndSetter, RefuseWhatTheyCannotCopyAndPassCodesOn)
-{
-    const Bytes area = attach_numbered();
-    uint8_t *const field = handle_area() + kOrder, *const buffer = fake::guarded(140), *const none = nullptr;
-    const struct {
-        uint8_t *field, *buffer;
-        uint32_t size;
-        uint8_t* area;
-    } refused[] = {{none, buffer, 4, handle_area()},
-                   {field, none, 4, handle_area()},
-                   {field, buffer, 0, handle_area()},
-                   {field, buffer, 4, none}};
-    for (const auto& row : refused) {
-        set_handle(handle_semaphore(), row.area);
-        EXPECT_EQ(bt_con_getter(row.field, row.buffer, row.size, 1), -1);
-        EXPECT_EQ(bt_con_setter(row.field, row.buffer, row.size, 1, 1), -1);
-    }
-    EXPECT_EQ(difference(area_bytes(), area), "");
-
-    set_handle(handle_semaphore(), fake::find_area(kAreaName));
-    for (const uint32_t failing : {1u, 2u}) {
-        const int32_t code = failing == 1 ? fake::kLockFailure : fake::kUnlockFailure;
-        std::memset(buffer, 0xA5, 140);
-        fake::fail_nth(failing);
-        EXPECT_EQ(bt_con_getter(field, buffer, 140, 1), code);
-        EXPECT_EQ(buffer[139], failing == 1 ? 0xA5 : area[kOrder + 139]);
-        std::memset(buffer, 0x77, 140);
-        fake::fail_nth(failing);
-        EXPECT_EQ(bt_con_setter(field, buffer, 140, 1, 1), code);
-        EXPECT_EQ(field[139], failing == 1 ? area[kOrder + 139] : 0x77);
-        EXPECT_EQ(difference(*fake::read_file(kImagePath), stale_image()), "");
-    }
-    for (const uint32_t write_from : {0u, 2u, 1u}) {
-        field[0] = 0;
-        EXPECT_EQ(bt_con_setter(field, buffer, 140, write_from, 0), 0);
-        EXPECT_EQ(field[0], 0x77);
-        EXPECT_EQ(difference(*fake::read_file(kImagePath), write_from == 1 ? image_of(area_bytes()) : stale_image()),
-                  "");
-    }
+    attached_process();
+    fake::remove_file(kImagePath); // an image that cannot be written is not reported
+    EXPECT_EQ(bt_con_setRegisteredOrderList(Given(other), 1), 0);
+    EXPECT_EQ(difference(area_bytes(kOrder, 140), other), "");
 }
 
 TEST(StoreAddress, SixBytesCountAndPaddingStays)

@@ -15,12 +15,15 @@ Bytes ids(const std::string& letters)
     return id_list(entries);
 }
 
+// A value of 0 is a null pointer.
 Row add(const std::string& letter, uint32_t key, uint8_t value, const Bytes& before, const Bytes& after)
 {
     return change(
         "add " + letter + " under " + std::to_string(key), before, after,
-        [=](At) { return bt_con_addRegisteredDeviceDIDInfo(dev(letter), key, Given(Bytes(8, value))); }, 0,
-        Locking::kUnlockIgnored);
+        [=](At) {
+            return bt_con_addRegisteredDeviceDIDInfo(dev(letter), key, Given(Bytes(value == 0 ? 0 : 8, value)));
+        },
+        0, Locking::kUnlockIgnored);
 }
 
 Row take(const std::string& letter, const std::string& before, const std::string& after, int32_t result = 0)
@@ -55,6 +58,8 @@ TEST(StoreDeviceIds, AddAndRemove)
               add("A", 0, 1, one, one),
               add("B", 0, 1, one, one),
               add("-", 5, 1, one, one),
+              add("B", 5, 0, one, one),
+              add("?", 5, 1, one, one),
               add("0", 5, 1, ids(""), ids("0")),
               take("A", "ABC", "BC"),
               take("B", "ABC", "AC"),
@@ -63,43 +68,20 @@ TEST(StoreDeviceIds, AddAndRemove)
               take("X", "ABC", "ABC", -2),
               take("X", "", "", -2),
               take("-", "ABC", "ABC", -2),
-              take("X", kSeventeen, kSeventeen)},
+              take("?", "ABC", "ABC", -2),
+              take("X", kSeventeen, kSeventeen),
+              take("A", kSeventeen, kSeventeen.substr(1)),
+              take("Q", kSeventeen, kSeventeen.substr(0, 16))},
              {kDeviceIds, 544, ids(""), {}});
-}
-
-TEST(StoreDeviceIds, RemoveFromAFullList)
-{
-    for (const size_t index : {size_t{0}, size_t{15}, size_t{16}}) {
-        uint8_t* const area = attached_process();
-        const Bytes full = ids(kSeventeen);
-        std::copy(full.begin(), full.end(), area + kDeviceIds);
-        EXPECT_EQ(bt_con_delRegisteredDeviceDIDInfo(dev(kSeventeen.substr(index, 1))), 0);
-        Bytes left = area_bytes(kDeviceIds, 544);
-        put(left, 518, {0, 0}); // behind the address of an empty entry anything may stand
-        EXPECT_EQ(difference(left, ids(std::string(kSeventeen).erase(index, 1))), "");
-    }
 }
 
 TEST(StoreDeviceIds, Read)
 {
     const Bytes full = ids(kSeventeen), one(8, 1), two(8, 2);
     run_rows({read("A", 5, 0, one), read("A", 9, 0, two), read("A", 8, -1), read("B", 5, -1), read("B", 0, -2),
-              read("X", 5, -2), read("-", 5, -2), read("X", 5, -2).on(full), read("Q", 5, 0, one).on(full)},
+              read("X", 5, -2), read("-", 5, -2), read("?", 5, -2), read("X", 5, -2).on(full),
+              read("Q", 5, 0, one).on(full)},
              {kDeviceIds, 0, id_list(id_entry('A', 5, 1, 9, 2) + id_entry('B', 0, 7)), {}});
-}
-
-TEST(StoreDeviceIds, NullPointersAreRefused)
-{
-    uint8_t* const area = attached_process();
-    const Bytes list = ids("A");
-    std::copy(list.begin(), list.end(), area + kDeviceIds);
-    EXPECT_EQ(bt_con_delRegisteredDeviceDIDInfo(nullptr), -2);
-    EXPECT_EQ(bt_con_getRegisteredDeviceDIDInfo(nullptr, 5, Given(Bytes(8))), -2);
-    EXPECT_EQ(bt_con_getRegisteredDeviceDIDInfo(dev("A"), 5, nullptr), -2);
-    EXPECT_EQ(bt_con_addRegisteredDeviceDIDInfo(nullptr, 5, Given(Bytes(8))), 0);
-    EXPECT_EQ(bt_con_addRegisteredDeviceDIDInfo(dev("B"), 5, nullptr), 0);
-    EXPECT_EQ(difference(area_bytes(kDeviceIds, 544), list), "");
-    EXPECT_EQ(fake::held_locks(), 0u);
 }
 
 TEST(StoreDeviceIds, SearchInACallersList)
@@ -142,12 +124,7 @@ TEST(StoreDeviceIds, SlotsOfACallersList)
                 {1, 9, -1, 0, {}, id_list(a + id_entry('X', 5, 1, 9, 3) + c)},
                 {2, 5, -1, -1, {}, {}},
                 {1, 0, -2, -2, {}, {}},
-                {16, 0, -2, -2, {}, {}},
-                {17, 5, -2, -2, {}, {}},
-                {18, 5, -2, -2, {}, {}},
-                {-1, 5, -2, -2, {}, {}},
-                {INT32_MIN, 5, -2, -2, {}, {}},
-                {INT32_MAX, 5, -2, -2, {}, {}}};
+                {16, 0, -2, -2, {}, {}}};
     for (const auto& row : rows) {
         SCOPED_TRACE("index " + std::to_string(row.index) + ", key " + std::to_string(row.key));
         const Given mine(list), value(Bytes(8, 0xA5));
@@ -158,6 +135,10 @@ TEST(StoreDeviceIds, SlotsOfACallersList)
         EXPECT_EQ(difference(mine.bytes(), row.after.empty() ? list : row.after), "");
     }
     const Given mine(list), value(Bytes(8, 0xA5));
+    for (const int32_t index : {17, 18, -1, INT32_MIN, INT32_MAX}) {
+        EXPECT_EQ(bt_con_getDeviceDIDInfo(index, 5, mine, value), -2);
+        EXPECT_EQ(bt_con_setDeviceDIDInfo(index, dev("X"), 5, mine, value), -2);
+    }
     EXPECT_EQ(bt_con_getDeviceDIDInfo(0, 5, nullptr, value), -2);
     EXPECT_EQ(bt_con_getDeviceDIDInfo(0, 5, mine, nullptr), -2);
     EXPECT_EQ(bt_con_setDeviceDIDInfo(0, nullptr, 5, mine, value), -2);

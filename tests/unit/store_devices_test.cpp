@@ -80,7 +80,8 @@ TEST(StoreDevices, AddAndUpdate)
         change("new, everything", ab, added_new("AB", 'C', kAll), add("C", kAll)),
         change("known, same name and other words", added(ab, 1, 1), added(ab, 1, 1), add("B", 1)),
         change("eighteenth", full, {}, add("X", kAll), -1),
-        change("no device", ab, {}, add("-"), -2, Locking::kNone),
+        refused("no device", -2, add("-")),
+        refused("null", -2, add("?", kAll)),
         quiet(change("negative count", with_count(-4, device_list("")), added_new("", 'X'), add("X"))),
         change("count too large", with_count(18, full), {}, add("X"), -1),
         quiet(change("known, count too large", with_count(INT32_MAX, full), added(full, 16), add("Q"))),
@@ -92,9 +93,6 @@ TEST(StoreDevices, AddAndUpdate)
         Row row = change("known, part " + std::to_string(i), ab, added(ab, 1, 1u << i), add("B", 1u << i));
         rows.push_back(kParts[i].persistent ? row : quiet(row));
     }
-    const auto null = [](At n) { return bt_con_addRegDev(nullptr, n, n, n, n, n, n, n, 1, 2, n, 3); };
-    rows.push_back(change(
-        "null", ab, {}, [=](At) { return null(nullptr); }, -2, Locking::kNone));
     run_rows(rows, field(17344, ""));
 }
 
@@ -108,23 +106,17 @@ TEST(StoreDevices, Remove)
         return change("remove " + std::to_string(count) + " of " + letters, device_list("ABC"), device_list(after),
                       [=](At) { return bt_con_delpluralRegDev(dev(letters), count); });
     };
-    const auto refused = [](const std::string& what, Call call, int32_t result, Locking locking) {
-        return change(what, device_list("ABC"), {}, std::move(call), result, locking);
-    };
     run_rows({one("A", "ABC", "BC"), one("B", "ABC", "AC"), one("C", "ABC", "AB"), one("A", "A", ""),
               one("A", kSeventeen, kSeventeen.substr(1)), one("Q", kSeventeen, kSixteen),
               one("Q", "", kSixteen).on(with_count(40, device_list(kSeventeen))), several("AB", 2, "C"),
               several("CXA-", 4, "B"), several("AA", 2, "BC"), several("AB", 1, "BC"), several("XY", 2, "ABC"),
               several("A", 0, "ABC"), several("A", -1, "ABC"), several("A", INT32_MIN, "ABC"),
               refused(
-                  "unknown", [](At) { return bt_con_delRegDev(dev("X")); }, -1, Locking::kReported),
-              refused(
-                  "no device", [](At) { return bt_con_delRegDev(dev("-")); }, -2, Locking::kNone),
-              refused(
-                  "null", [](At) { return bt_con_delRegDev(nullptr); }, -2, Locking::kNone),
-              refused(
-                  "several, null", [](At) { return bt_con_delpluralRegDev(nullptr, 1); }, -2, Locking::kNone)},
-             field(17344, ""));
+                  "unknown", -1, [](At) { return bt_con_delRegDev(dev("X")); }, Locking::kReported),
+              refused("no device", -2, [](At) { return bt_con_delRegDev(dev("-")); }),
+              refused("null", -2, [](At) { return bt_con_delRegDev(dev("?")); }),
+              refused("several, null", -2, [](At) { return bt_con_delpluralRegDev(nullptr, 1); })},
+             field(17344, "ABC"));
 }
 
 TEST(StoreDevices, ReadOne)
@@ -135,9 +127,8 @@ TEST(StoreDevices, ReadOne)
             const auto to = [&](unsigned output, size_t at) {
                 return (outputs & output) != 0 ? out + at : At(nullptr);
             };
-            const Given address = dev(letter);
-            return bt_con_getRegDev(letter[0] == '?' ? At(nullptr) : At(address), to(kRecord, 0), to(kIndex, 1008),
-                                    to(kAttribute, 1012), to(kMode, 1016), to(kRole, 1020));
+            return bt_con_getRegDev(dev(letter), to(kRecord, 0), to(kIndex, 1008), to(kAttribute, 1012),
+                                    to(kMode, 1016), to(kRole, 1020));
         };
     };
     const auto name = [](const char* letter) {
@@ -148,27 +139,21 @@ TEST(StoreDevices, ReadOne)
     };
     const Bytes known = device_record('B') + words({1, 0x142, 0x242, 0x342});
     const Bytes unknown = Bytes(1008, 0xA5) + words({UINT32_MAX, 0}) + Bytes(8, 0xA5);
-    const Bytes refused = Bytes(1008, 0xA5) + words({UINT32_MAX}) + Bytes(12, 0xA5);
+    const Bytes not_asked = Bytes(1008, 0xA5) + words({UINT32_MAX}) + Bytes(12, 0xA5);
     const Bytes no_name = words({106, 0}) + Bytes(248, 0);
     run_rows({answer("known", read("B"), known, 0, Locking::kReported, unknown),
               answer("unknown", read("X"), unknown, 0, Locking::kReported, unknown),
-              answer("no device", read("-"), refused, -2), answer("null", read("?"), refused, -2),
-              answer("null record", read("B", kEvery - kRecord), refused, -2),
-              answer("null attribute", read("B", kEvery - kAttribute), refused, -2),
+              answer("no device", read("-"), not_asked, -2), answer("null", read("?"), not_asked, -2),
+              answer("null record", read("B", kEvery - kRecord), not_asked, -2),
+              answer("null attribute", read("B", kEvery - kAttribute), not_asked, -2),
               answer("name", name("B"), Bytes(256, 'B'), 0, Locking::kUnlockSpoils, no_name),
               answer("name of an unknown", name("X"), no_name, -1, Locking::kUnlockSpoils, no_name),
-              answer("name of no device", name("-"), no_name, -2),
-              answer(
-                  "name, null", [](At out) { return bt_con_getRegisterDeviceName(nullptr, out); }, {}, -1),
-              answer(
-                  "name, null output", [](At) { return bt_con_getRegisterDeviceName(dev("B"), nullptr); }, {}, -1),
-              answer("index", index("C"), {}, 2), answer("index of an unknown", index("X"), {}, -1),
-              answer(
-                  "index, null", [](At) { return bt_con_getRegisterDeviceIndex(nullptr); }, {}, -1),
+              answer("name of no device", name("-"), no_name, -2), refused("name, null", -1, name("?")),
+              refused("name, null output", -1, nulled(name("B"))), refused("index", 2, index("C")),
+              refused("index of an unknown", -1, index("X")), refused("index, null", -1, index("?")),
               answer(
                   "number", [](At out) { return bt_con_getRegisterDeviceNum(out); }, words({3}) + Bytes(4, 0xA5)),
-              answer(
-                  "number, null", [](At) { return bt_con_getRegisterDeviceNum(nullptr); }, {}, -1)},
+              refused("number, null", -1, [](At) { return bt_con_getRegisterDeviceNum(nullptr); })},
              field(0, "ABC"));
 
     attached_process(device_list("B"));

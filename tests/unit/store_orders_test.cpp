@@ -34,11 +34,6 @@ Row forget(const std::string& letter, uint32_t profile, const std::string& befor
                   [=](At) { return bt_con_delConnectOrder(dev(letter), profile); });
 }
 
-Row refused(const std::string& what, Call call, int32_t result)
-{
-    return answer(what, std::move(call), {}, result);
-}
-
 Bytes slot_of(char letter)
 {
     return address(letter) + Bytes(2, 0xA5);
@@ -68,12 +63,9 @@ TEST(StoreOrders, RegisteredList)
               change("empty", order_list("ABC", false), none, empty),
               change("empty an empty one", none, none, empty),
               change("empty an impossible one", with_count(-9, none), none, empty),
-              refused(
-                  "append null", [](At) { return bt_con_addOrderList(nullptr); }, -2),
-              refused(
-                  "append no device", [](At) { return bt_con_addOrderList(dev("-")); }, -2),
-              refused(
-                  "remove null", [](At) { return bt_con_delOrderList(nullptr); }, -2)},
+              refused("append null", -2, append("?", "", "").call),
+              refused("append no device", -2, append("-", "", "").call),
+              refused("remove null", -2, take("?", "", "").call)},
              {kOrder, 140, order_list("ABC"), {{kOrder, 17}}});
 }
 
@@ -88,20 +80,15 @@ TEST(StoreOrders, RegisteredListReaders)
     const Call all = [](At out) { return bt_con_getallOrderList(out); };
     run_rows({answer("first", one(0), slot_of('A')), answer("second", one(1), slot_of('B')),
               answer("behind the used ones", one(5), slot_of('-')), answer("last slot", one(16), slot_of('-')),
-              refused("position 17", one(17), -1), refused("position -1", one(-1), -1),
-              refused("position INT32_MIN", one(INT32_MIN), -1), refused("empty list", one(0), -1).on(order_list("")),
-              refused("one of a negative count", one(0), -1).on(with_count(-2, kFull)),
+              refused("position 17", -1, one(17)), refused("position -1", -1, one(-1)),
+              refused("position INT32_MIN", -1, one(INT32_MIN)), refused("empty list", -1, one(0)).on(order_list("")),
+              refused("one of a negative count", -1, one(0)).on(with_count(-2, kFull)),
               answer("all", all, order_list("AB")),
               answer("all of a count too large", all, kFull).on(with_count(18, kFull)),
               answer("all of a negative count", all, order_list("")).on(with_count(INT32_MIN, order_list(""))),
               find("B", 1), find("X", UINT32_MAX), find("Q", 16).on(with_count(99, kFull)),
-              find("A", UINT32_MAX).on(with_count(-1, kFull)),
-              refused(
-                  "one, null", [](At) { return bt_con_getoneOrderList(nullptr, 0); }, -2),
-              refused(
-                  "all, null", [](At) { return bt_con_getallOrderList(nullptr); }, -2),
-              refused(
-                  "find, null output", [](At) { return bt_con_SearshOrderListAddr(dev("A"), nullptr); }, -2)},
+              find("A", UINT32_MAX).on(with_count(-1, kFull)), refused("one, null", -2, nulled(one(0))),
+              refused("all, null", -2, nulled(all)), refused("find, null output", -2, nulled(find("A", 0).call))},
              {kOrder, 0, order_list("AB"), {{kOrder, 17}}});
     EXPECT_EQ(bt_con_SearshOrderListAddr(nullptr, Given(Bytes(4))), -2);
 }
@@ -135,15 +122,12 @@ TEST(StoreOrders, ProfileLists)
                              forget("Q", 0, "", kSixteen).on(with_count(18, full)),
                              change("empty", profile_orders(5, "ABC", false), none, empty),
                              change("empty empty ones", none, none, empty),
-                             refused(
-                                 "connect null", [](At) { return bt_con_addConnectOrder(nullptr, 0); }, -2),
-                             refused(
-                                 "connect no device", [](At) { return bt_con_addConnectOrder(dev("-"), 0); }, -2),
-                             refused(
-                                 "forget null", [](At) { return bt_con_delConnectOrder(nullptr, 0); }, -2)};
+                             refused("connect null", -2, connect("?", 0, "", "").call),
+                             refused("connect no device", -2, connect("-", 0, "", "").call),
+                             refused("forget null", -2, forget("?", 0, "", "").call)};
     for (const uint32_t profile : {8u, 0x80000000u, UINT32_MAX}) {
-        rows.push_back(refused("connect on no profile", connect("X", profile, "", "").call, -2));
-        rows.push_back(refused("forget on no profile", forget("A", profile, "", "").call, -2));
+        rows.push_back(refused("connect on no profile", -2, connect("X", profile, "", "").call));
+        rows.push_back(refused("forget on no profile", -2, forget("A", profile, "", "").call));
     }
     run_rows(rows, {kProfileOrders, 1120, profile_orders(0, "A"), counts});
 }
@@ -163,17 +147,15 @@ TEST(StoreOrders, ProfileListReaders)
                              answer("all of profile 7", all(7), order_list("BA")).on(of_7),
                              answer("all of a count too large", all(0), kFull).on(with_count(18, full)),
                              answer("all of a negative count", all(0), order_list("")).on(with_count(-1, none)),
-                             refused("position 17", one(0, 17), -1),
-                             refused("position -1", one(0, -1), -1),
-                             refused("empty list", one(0, 0), -1).on(none),
-                             refused("one of a negative count", one(0, 0), -1).on(with_count(-1, full)),
-                             refused(
-                                 "one, null", [](At) { return bt_con_getoneConnectOrder(nullptr, 0, 0); }, -1),
-                             refused(
-                                 "all, null", [](At) { return bt_con_getallConnectOrder(nullptr, 0); }, -2)};
+                             refused("position 17", -1, one(0, 17)),
+                             refused("position -1", -1, one(0, -1)),
+                             refused("empty list", -1, one(0, 0)).on(none),
+                             refused("one of a negative count", -1, one(0, 0)).on(with_count(-1, full)),
+                             refused("one, null", -1, nulled(one(0, 0))),
+                             refused("all, null", -2, nulled(all(0)))};
     for (const uint32_t profile : {8u, 0x80000000u, UINT32_MAX}) {
-        rows.push_back(refused("one of no profile", one(profile, 0), -2));
-        rows.push_back(refused("all of no profile", all(profile), -2));
+        rows.push_back(refused("one of no profile", -2, one(profile, 0)));
+        rows.push_back(refused("all of no profile", -2, all(profile)));
     }
     run_rows(rows, {kProfileOrders, 0, profile_orders(0, "BA"), {{kProfileOrders, 17}, {kProfileOrders + 980, 17}}});
 }
@@ -184,57 +166,51 @@ TEST(StoreOrders, ShiftUp)
         std::string before;
         int32_t position, result;
         std::string after;
-    } rows[] = {{"ABC", 0, 0, "BC"},
-                {"ABC", 1, 0, "AC"},
-                {"ABC", 2, 0, "AB"},
-                {"A", 0, 0, ""},
-                {kSeventeen, 16, 0, kSixteen},
-                {kSeventeen, 0, 0, kSeventeen.substr(1)},
-                {"ABC", 3, -1, "ABC"},
-                {"", 0, -1, ""},
-                {kSeventeen, 17, -1, kSeventeen},
-                {"ABC", -1, -1, "ABC"},
-                {"ABC", INT32_MIN, -1, "ABC"},
-                {"ABC", INT32_MAX, -1, "ABC"}};
+    } rows[] = {{"ABC", 0, 0, "BC"}, {"ABC", 1, 0, "AC"},           {"ABC", 2, 0, "AB"},
+                {"A", 0, 0, ""},     {kSeventeen, 16, 0, kSixteen}, {kSeventeen, 0, 0, kSeventeen.substr(1)}};
     for (const auto& row : rows) {
         const Given list(order_list(row.before));
         EXPECT_EQ(bt_con_moveupOrderList(list, row.position), row.result) << row.before << row.position;
         EXPECT_EQ(difference(list.bytes(), order_list(row.after)), "") << row.before << row.position;
     }
+    const Given abc(order_list("ABC"));
+    for (const int32_t position : {3, 17, -1, INT32_MIN, INT32_MAX})
+        EXPECT_EQ(bt_con_moveupOrderList(abc, position), -1);
     EXPECT_EQ(bt_con_moveupOrderList(nullptr, 0), -1);
+    EXPECT_EQ(bt_con_moveupOrderList(Given(order_list("")), 0), -1);
+    EXPECT_EQ(difference(abc.bytes(), order_list("ABC")), "");
 }
 
 TEST(StoreOrders, ShiftDown)
 {
     const struct {
         std::string before;
-        int32_t to, from, insert, result;
+        int32_t to, from, insert;
         std::string after;
-    } rows[] = {{"ABC", 0, 2, 1, 0, "XABC"},
-                {"ABC", 1, 2, 1, 0, "AXBC"},
-                {"ABC", 0, 2, 0, 0, "XAB"},
-                {"ABC", 0, 2, 2, 0, "XAB"},
-                {"ABC", 0, 1, 0, 0, "XAC"},
-                {"ABC", 1, 1, 0, 0, "AXC"},
-                {kSeventeen, 0, 16, 1, 0, "X" + kSixteen},
-                {kSeventeen, 16, 16, 1, 0, kSixteen + "X"},
-                {kSeventeen, 16, 16, 0, 0, kSixteen + "X"},
-                {kSixteen, 0, 15, 1, 0, "X" + kSixteen},
-                {"ABC", 3, 2, 1, -1, "ABC"},
-                {"ABC", 17, 17, 1, -1, "ABC"},
-                {"ABC", 0, 17, 1, -1, "ABC"},
-                {"ABC", 0, INT32_MAX, 1, -1, "ABC"},
-                {"ABC", -1, 2, 1, -1, "ABC"},
-                {"ABC", INT32_MIN, INT32_MIN, 1, -1, "ABC"},
-                {"ABC", -2, -1, 0, -1, "ABC"}};
+    } rows[] = {{"ABC", 0, 2, 1, "XABC"},
+                {"ABC", 1, 2, 1, "AXBC"},
+                {"ABC", 0, 2, 0, "XAB"},
+                {"ABC", 0, 2, 2, "XAB"},
+                {"ABC", 0, 1, 0, "XAC"},
+                {"ABC", 1, 1, 0, "AXC"},
+                {kSeventeen, 0, 16, 1, "X" + kSixteen},
+                {kSeventeen, 16, 16, 1, kSixteen + "X"},
+                {kSeventeen, 16, 16, 0, kSixteen + "X"},
+                {kSixteen, 0, 15, 1, "X" + kSixteen}};
     for (const auto& row : rows) {
         SCOPED_TRACE(row.before + " to " + std::to_string(row.to) + " from " + std::to_string(row.from));
         const Given list(order_list(row.before));
-        EXPECT_EQ(bt_con_movedownOrderList(dev("X"), list, row.to, row.from, row.insert), row.result);
+        EXPECT_EQ(bt_con_movedownOrderList(dev("X"), list, row.to, row.from, row.insert), 0);
         EXPECT_EQ(difference(list.bytes(), order_list(row.after)), "");
     }
-    EXPECT_EQ(bt_con_movedownOrderList(nullptr, Given(kFull), 0, 1, 0), -1);
+    const Given abc(order_list("ABC"));
+    const std::pair<int32_t, int32_t> refused_places[] = {
+        {3, 2}, {17, 17}, {0, 17}, {0, INT32_MAX}, {-1, 2}, {-2, -1}, {INT32_MIN, INT32_MIN}};
+    for (const auto& [to, from] : refused_places)
+        EXPECT_EQ(bt_con_movedownOrderList(dev("X"), abc, to, from, 1), -1) << to << " from " << from;
+    EXPECT_EQ(bt_con_movedownOrderList(nullptr, abc, 0, 1, 0), -1);
     EXPECT_EQ(bt_con_movedownOrderList(dev("X"), nullptr, 0, 1, 0), -1);
+    EXPECT_EQ(difference(abc.bytes(), order_list("ABC")), "");
 }
 
 TEST(StoreOrders, ShiftsStayInsideAListOfImpossibleCount)

@@ -45,10 +45,8 @@ TEST(StoreSearchList, AddAndClear)
               report("negative count is an empty list", x, with_count(INT32_MIN, none), search_list(x)),
               report("count too large is a full list", nine, with_count(33, kFull), {}),
               report("again, count too large", again_last, with_count(INT32_MAX, kFull), refreshed_last),
-              answer(
-                  "null", [](At) { return bt_con_addSearchdevlist(nullptr); }, {}, -2),
-              answer(
-                  "no device", [](At) { return bt_con_addSearchdevlist(Given(device_info('-', 1))); }, {}, -2),
+              refused("null", -2, [](At) { return bt_con_addSearchdevlist(nullptr); }),
+              refused("no device", -2, [](At) { return bt_con_addSearchdevlist(Given(device_info('-', 1))); }),
               change("clear", search_list(found("AB")), none, clear, 0, Locking::kAccessor),
               change("clear what was never set", Bytes(8580, 0x5A), none, clear, 0, Locking::kAccessor)},
              {kSearch, 8580, none, {{kSearch, 32}}});
@@ -99,17 +97,15 @@ TEST(StoreSettings, OneWordIsReadOrWritten)
         return change("write " + std::to_string(vtype), four, after,
                       [=](At) { return bt_con_setSettingStatusVtype(value, vtype); });
     };
-    std::vector<Row> rows = {
-        get(0, 10),
-        get(3, 13),
-        set(1, 2, words({10, 11, 1, 13})),
-        set(UINT32_MAX, 3, words({10, 11, 12, UINT32_MAX})),
-        set(11, 1, four),
-        answer(
-            "read into nothing", [](At) { return bt_con_getSettingStatusVtype(nullptr, 0); }, {}, -2)};
+    std::vector<Row> rows = {get(0, 10),
+                             get(3, 13),
+                             set(1, 2, words({10, 11, 1, 13})),
+                             set(UINT32_MAX, 3, words({10, 11, 12, UINT32_MAX})),
+                             set(11, 1, four),
+                             refused("read into nothing", -2, nulled(get(0, 0).call))};
     for (const uint32_t vtype : {4u, 0x80000000u, UINT32_MAX}) {
-        rows.push_back(answer("read none", get(vtype, 0).call, {}, -2));
-        rows.push_back(answer("write none", set(1, vtype, four).call, {}, -2));
+        rows.push_back(refused("read none", -2, get(vtype, 0).call));
+        rows.push_back(refused("write none", -2, set(1, vtype, four).call));
     }
     run_rows(rows, {27728, 16, four, {}});
 }

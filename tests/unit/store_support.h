@@ -39,14 +39,15 @@ private:
     void* memory_;
 };
 
-// Bytes of the caller for a parameter of any pointer type, exactly as long as they are.
+// Bytes of the caller for a parameter of any pointer type, exactly as long as they are; none are a null
+// pointer.
 class Given {
 public:
     explicit Given(Bytes bytes) : bytes_(std::move(bytes)) {}
     template <class T>
     operator T*() const
     {
-        return static_cast<T*>(static_cast<void*>(bytes_.data()));
+        return bytes_.empty() ? nullptr : static_cast<T*>(static_cast<void*>(bytes_.data()));
     }
     const Bytes& bytes() const { return bytes_; }
 
@@ -60,7 +61,7 @@ void put(Bytes& bytes, size_t at, const Bytes& part);
 Bytes with_count(int32_t count, Bytes list); // the word at its start
 std::string difference(const Bytes& got, const Bytes& want); // empty when there is none
 
-// Slots of devices, named by a letter: 'A' is 41 10 20 30 40 50, '0' is 00 x 6, '-' is FF x 6; EE EF behind each.
+// Slots of devices, named by a letter: 'A' is 41 10 20 30 40 50, '0' is 00 x 6, '-' is FF x 6; EE EF behind each. '?' is null.
 Given dev(const std::string& letters);
 Bytes address(char letter); // the six bytes
 
@@ -90,8 +91,9 @@ enum class Locking {
     kReported, // a failure of the closing unlock is the result
     kUnlockIgnored, // a failure of the closing unlock is not reported
     kUnlockSpoils, // a failure of the closing unlock is the result and spoils the answer
-    kAccessor, // locks inside a field accessor: every failure is -1 and keeps the image as it was
     kNumber, // answers a number: every failure but that of the unlock is 0
+    kGeneric, // locks inside the generic setter: a failure of the unlock is the result and keeps the image
+    kAccessor, // the same inside a field accessor, where every failure is -1
 };
 
 using Call = std::function<int32_t(At out)>; // `out` ends at an unreadable page
@@ -113,6 +115,8 @@ Row change(const std::string& what, Bytes before, Bytes after, Call call, int32_
            Locking locking = Locking::kReported);
 Row answer(const std::string& what, Call call, Bytes out, int32_t result = 0, Locking locking = Locking::kNone,
            Bytes out_failed = {});
+Row refused(const std::string& what, int32_t result, Call call, Locking locking = Locking::kNone);
+Call nulled(Call call); // the call with null for its output
 
 struct Field {
     size_t at, owned; // nothing but `owned` bytes there may change

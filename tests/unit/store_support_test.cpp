@@ -21,7 +21,7 @@ Bytes operator+(Bytes left, const Bytes& right)
 
 void put(Bytes& bytes, size_t at, const Bytes& part)
 {
-    std::memcpy(bytes.data() + at, part.data(), part.size());
+    std::copy(part.begin(), part.end(), bytes.begin() + static_cast<ptrdiff_t>(at));
 }
 
 Bytes with_count(int32_t count, Bytes list)
@@ -52,7 +52,7 @@ Given dev(const std::string& letters)
 {
     Bytes slots;
     for (const char letter : letters)
-        slots = slots + address(letter) + Bytes{0xEE, 0xEF};
+        if (letter != '?') slots = slots + address(letter) + Bytes{0xEE, 0xEF};
     return Given(slots);
 }
 
@@ -200,6 +200,16 @@ Row answer(const std::string& what, Call call, Bytes out, int32_t result, Lockin
     return {what, std::move(call), result, locking, {}, {}, std::move(out), std::move(out_failed)};
 }
 
+Row refused(const std::string& what, int32_t result, Call call, Locking locking)
+{
+    return {what, std::move(call), result, locking};
+}
+
+Call nulled(Call call)
+{
+    return [=](At) { return call(nullptr); };
+}
+
 namespace {
 
 using Spoil = std::function<void(uint8_t* area)>;
@@ -263,8 +273,9 @@ private:
         const Locking locking = row_.locking;
         if (call == "SemUnlock") {
             if (locking == Locking::kAccessor) return -1;
-            const bool told = locking == Locking::kUnlockSpoils || (locking == Locking::kReported && row_.result == 0);
-            return told ? fake::kUnlockFailure : row_.result;
+            if (locking == Locking::kUnlockSpoils) return fake::kUnlockFailure;
+            const bool ignored = locking == Locking::kUnlockIgnored || locking == Locking::kNumber;
+            return ignored || row_.result != 0 ? row_.result : fake::kUnlockFailure;
         }
         if (locking == Locking::kNumber) return 0;
         if (call == "SemLock") return locking == Locking::kAccessor ? -1 : fake::kLockFailure;
@@ -282,7 +293,7 @@ private:
             EXPECT_EQ(result_, code_of_failure(failed));
             EXPECT_EQ(fake::stray_unlocks(), failed == "SemLock" ? 1u : 0u);
             if (failed == "SemUnlock" && row_.locking != Locking::kUnlockSpoils)
-                expect_new(writes_image_ && row_.locking != Locking::kAccessor);
+                expect_new(writes_image_ && row_.locking < Locking::kGeneric);
             else
                 expect_old();
         }
