@@ -232,6 +232,24 @@ TEST_F(PlatformMessages, NumberHasOneLivingOwner)
     EXPECT_EQ(receive(&message, 0), 1) << "the end of the former owner takes nothing away";
 }
 
+TEST_F(PlatformMessages, ReleaseEndsWaitingReceives)
+{
+    ASSERT_EQ(bt_host_claim_pno(kPno), 0);
+    std::atomic<bool> waits{false};
+    std::thread receiver([&waits] {
+        Numbered message;
+        EXPECT_EQ(receive(&message, kLongMs), 1);
+        waits = true;
+        EXPECT_EQ(receive(&message, kLongMs), -1);
+    });
+    ASSERT_EQ(post(Numbered()), 0);
+    while (!waits)
+        sched_yield();
+    EXPECT_EQ(bt_host_release_pno(), 0);
+    receiver.join();
+    EXPECT_EQ(bt_host_claim_pno(kPno), 0);
+}
+
 TEST_F(PlatformMessages, ChildOfAnOwnerOwnsNothing)
 {
     setenv("BT_PLATFORM_PNO", "0x8C1", 1);

@@ -220,6 +220,42 @@ TEST_F(PlatformObjects, NoContentOfAQueueMisleadsOwnerOrSender)
     }));
 }
 
+// What a sender that is stopped or killed at its worst moments leaves behind, made by hand.
+TEST_F(PlatformObjects, SenderStoppedOrKilledInTheMiddleBlocksNobodyForLong)
+{
+    Line line;
+    Child holder([&] {
+        Raw raw(object(Kind::queue));
+        ASSERT_EQ(pthread_mutex_lock(&raw.ring().lock), 0);
+        line.say_to_parent();
+        line.hear_parent();
+    });
+    line.hear_child();
+    EXPECT_EQ(post(Numbered()), 4);
+    BtHostQueue queue{};
+    EXPECT_EQ(bt_host_list_queues(&queue, 1), 1) << "listing does not need the lock";
+    holder.kill_now();
+    EXPECT_EQ(post(Numbered()), 0) << bt_host_error();
+}
+
+TEST_F(PlatformObjects, MessageWithoutItsRingIsFound)
+{
+    Line line;
+    Child receiver([&] {
+        ASSERT_EQ(bt_host_claim_pno(kPno), 0);
+        line.say_to_parent();
+        Numbered message;
+        EXPECT_EQ(receive(&message, kLongMs), 1);
+    });
+    line.hear_child();
+    Raw raw(object(Kind::queue));
+    while (raw.ring().sleepers == 0)
+        sched_yield();
+    raw.ring().slots[0].size = sizeof(Numbered);
+    ++raw.ring().tail; // posted by somebody who died before ringing
+    EXPECT_TRUE(receiver.succeeded());
+}
+
 TEST_F(PlatformObjects, NoContentOfTheDomainMisleads)
 {
     ASSERT_TRUE(in_child([&] {
