@@ -23,18 +23,18 @@ extern "C" {
 #endif
 
 enum {
-    BT_HOST_ANY_PNO = 0,             /**< for bt_host_claim_pno(): any free number of the range below */
+    BT_HOST_ANY_PNO = 0, /**< for bt_host_claim_pno(): any free number of the range below */
     BT_HOST_FIRST_FREE_PNO = 0x4000,
     BT_HOST_LAST_FREE_PNO = 0x7FFF,
-    BT_HOST_NAME_MAX = 64,           /**< longest name of shared data and locks, terminating zero included */
-    BT_HOST_TIMER_MAX = 64           /**< timers of a process that run at the same time */
+    BT_HOST_NAME_MAX = 64, /**< longest name of shared data and locks, terminating zero included */
+    BT_HOST_TIMER_MAX = 64 /**< timers of a process that run at the same time */
 };
 
 /** Name of the domain in force; valid until the domain changes. */
-BT_PLATFORM_API const char *bt_host_domain(void);
+BT_PLATFORM_API const char* bt_host_domain(void);
 
 /** What the last failed call of this thread has to say; empty when none failed. Also set by failing _sys_ calls. */
-BT_PLATFORM_API const char *bt_host_error(void);
+BT_PLATFORM_API const char* bt_host_error(void);
 
 /**
  * Creates the domain. Processes may do so at the same time: one gets 0, the others 1. Nothing that a process killed at it
@@ -82,7 +82,7 @@ BT_PLATFORM_API int32_t bt_host_release_pno(void);
  * @param timeout_ms  0 does not wait, negative waits without limit
  * @return 1 a message; 0 none in time, or a signal; -1 the layer is unusable or no number is owned
  */
-BT_PLATFORM_API int32_t bt_host_receive(void *buffer, uint32_t size, int32_t timeout_ms);
+BT_PLATFORM_API int32_t bt_host_receive(void* buffer, uint32_t size, int32_t timeout_ms);
 
 /**
  * A descriptor that polls readable while messages wait, for programs with their own loop.
@@ -101,26 +101,26 @@ BT_PLATFORM_API int32_t bt_host_receive_fd(void);
  * @param size  bytes, not 0
  * @return 0 created; 1 it exists with that size, content kept; -1 failure, also when it exists with another size
  */
-BT_PLATFORM_API int32_t bt_host_create_data(const char *name, uint32_t size);
+BT_PLATFORM_API int32_t bt_host_create_data(const char* name, uint32_t size);
 
 /** Removes shared data. Links made before stay valid; the next link looks for it anew. @return 0, -1 when there is none */
-BT_PLATFORM_API int32_t bt_host_remove_data(const char *name);
+BT_PLATFORM_API int32_t bt_host_remove_data(const char* name);
 
 /** A process number and its queue. */
 typedef struct BtHostQueue {
     uint32_t pno;
-    uint32_t owner_pid;              /**< 0 when the owner is gone */
-    uint32_t queued;                 /**< messages that wait */
+    uint32_t owner_pid; /**< 0 when the owner is gone */
+    uint32_t queued; /**< messages that wait */
     uint32_t capacity;
-    uint64_t posted;                 /**< messages accepted so far */
-    uint64_t refused;                /**< posts refused because the queue was full */
+    uint64_t posted; /**< messages accepted so far */
+    uint64_t refused; /**< posts refused because the queue was full */
 } BtHostQueue;
 
 /** A named lock. */
 typedef struct BtHostLock {
     char name[BT_HOST_NAME_MAX];
-    uint32_t holder_pid;             /**< 0 when free */
-    uint32_t recovered;              /**< times it was handed on from a dead holder */
+    uint32_t holder_pid; /**< 0 when free */
+    uint32_t recovered; /**< times it was handed on from a dead holder */
 } BtHostLock;
 
 /** Named shared data. */
@@ -130,9 +130,9 @@ typedef struct BtHostData {
 } BtHostData;
 
 /** Lists what the domain holds, at most `maximum` records. Changes nothing. @return number of records, -1 failure */
-BT_PLATFORM_API int32_t bt_host_list_queues(BtHostQueue *out, int32_t maximum);
-BT_PLATFORM_API int32_t bt_host_list_locks(BtHostLock *out, int32_t maximum);
-BT_PLATFORM_API int32_t bt_host_list_data(BtHostData *out, int32_t maximum);
+BT_PLATFORM_API int32_t bt_host_list_queues(BtHostQueue* out, int32_t maximum);
+BT_PLATFORM_API int32_t bt_host_list_locks(BtHostLock* out, int32_t maximum);
+BT_PLATFORM_API int32_t bt_host_list_data(BtHostData* out, int32_t maximum);
 
 #ifdef __cplusplus
 }

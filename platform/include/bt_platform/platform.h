@@ -43,7 +43,7 @@ extern "C" {
  *         queue is full; 3 size out of range or null message; 4 the queue could not be had in time; -1 only when the
  *         layer itself is unusable (its objects are missing or foreign)
  */
-BT_PLATFORM_API int32_t _sys_SndMsg(uint32_t pno, uint32_t size, const void *message, uint32_t zero);
+BT_PLATFORM_API int32_t _sys_SndMsg(uint32_t pno, uint32_t size, const void* message, uint32_t zero);
 
 /**
  * Takes the calling process's next message, waiting for one.
@@ -58,7 +58,7 @@ BT_PLATFORM_API int32_t _sys_SndMsg(uint32_t pno, uint32_t size, const void *mes
  * @return 1 a message was delivered; 0 none (a signal ended the wait); -1 the layer is unusable, or the process does not
  *         own the number
  */
-BT_PLATFORM_API int32_t _sys_RcvMsg(uint32_t own_pno, uint32_t size, void *buffer, uint32_t zero);
+BT_PLATFORM_API int32_t _sys_RcvMsg(uint32_t own_pno, uint32_t size, void* buffer, uint32_t zero);
 
 /** Returns the calling process's number, 0 when it has none. Never blocks. */
 BT_PLATFORM_API uint32_t _sys_GetPno(void);
@@ -71,7 +71,7 @@ BT_PLATFORM_API void _sys_Exit(int32_t code);
  *
  * @return its handle, valid for the life of the process and the same for every call with the same name; 0 on failure
  */
-BT_PLATFORM_API uint32_t _sys_CreateSemaphore(const char *name);
+BT_PLATFORM_API uint32_t _sys_CreateSemaphore(const char* name);
 
 /**
  * Takes a lock, waiting a bounded time. A lock whose holder died is handed on.
@@ -91,7 +91,7 @@ BT_PLATFORM_API int32_t _sys_SemUnlock(uint32_t handle);
  * @param size     in: the size the caller needs, 0 for any; out: the size of the data
  * @return 0 linked; non-zero when there is no such data or it is smaller than asked
  */
-BT_PLATFORM_API int32_t _sys_LinkShareData(const char *name, void **address, uint32_t *size);
+BT_PLATFORM_API int32_t _sys_LinkShareData(const char* name, void** address, uint32_t* size);
 
 /**
  * Starts or restarts a one-shot timer of the process. Expiry is a message in the process's own queue: src_pno its own
@@ -117,17 +117,17 @@ BT_PLATFORM_API int32_t _sys_TimerStop(uint32_t pno, uint32_t timer_id, uint32_t
 BT_PLATFORM_API int32_t _sys_SetupZX44API(uint32_t value);
 
 /** Writes one log record under a zone when the zone is enabled in the library's parameter block. */
-BT_PLATFORM_API void QvLog(uint32_t facility, uint32_t zone, const char *tag, const char *format, ...)
+BT_PLATFORM_API void QvLog(uint32_t facility, uint32_t zone, const char* tag, const char* format, ...)
     BT_PLATFORM_PRINTF(4, 5);
 
 /** Names the process in log records. The text is copied. */
-BT_PLATFORM_API void QvLogSetProcessName(const char *name);
+BT_PLATFORM_API void QvLogSetProcessName(const char* name);
 
 /** Enables the `count` zones, 0..255, that follow as ints, and no others. */
 BT_PLATFORM_API void QvLogSetZones(int32_t count, ...);
 
 /** Writes one log record at a level, with the line and function it comes from. */
-BT_PLATFORM_API void ZelLog(int32_t level, int32_t line, const char *function, const char *format, ...)
+BT_PLATFORM_API void ZelLog(int32_t level, int32_t line, const char* function, const char* format, ...)
     BT_PLATFORM_PRINTF(4, 5);
 
 #ifdef __cplusplus
