@@ -4,8 +4,6 @@
 #include <bt_service/bt_hands_free.h>
 #include <gmock/gmock.h>
 
-#include <thread>
-
 namespace {
 
 using fake::Bytes;
@@ -104,59 +102,36 @@ TEST_F(HandsFreeStatus, HandleGrowsStepByStepAndStays)
     EXPECT_NE(g_bt_hfp_share.semaphore, 0u) << "a failed link does not stop the lock";
 }
 
-TEST_F(HandsFreeStatus, QueriesCopyTheirFieldUnderTheLock)
+TEST_F(HandsFreeStatus, QueriesCopyTheirFieldOnceAreaAndLockAreThere)
 {
-    const uint8_t* const area = patterned_area();
-    for (const Query& row : kQueries) {
-        SCOPED_TRACE(row.name);
-        g_bt_hfp_share = {};
-        const Bytes field(area + row.offset, area + row.offset + row.size);
-        size_t before = fake::calls().size();
-        EXPECT_EQ(output_of(row, 0), field);
-        EXPECT_THAT(calls_since(before), ElementsAre(kLink, kCreate, "SemLock", "SemUnlock"));
-        before = fake::calls().size();
-        EXPECT_EQ(output_of(row, 0), field);
-        EXPECT_THAT(calls_since(before), ElementsAre("SemLock", "SemUnlock"));
-    }
-    EXPECT_EQ(fake::held_locks(), 0u);
-    EXPECT_EQ(fake::deepest_lock(), 1u);
-    EXPECT_EQ(fake::stray_unlocks(), 0u);
-    EXPECT_THAT(fake::logs(), IsEmpty());
-}
-
-TEST_F(HandsFreeStatus, QueriesWithoutAreaOrLockAnswerMinusOneUntilTheyAreThere)
-{
-    for (const Query& row : kQueries) {
-        SCOPED_TRACE(row.name);
-        fake::reset();
-        g_bt_hfp_share = {};
-        EXPECT_EQ(output_of(row, -1), Bytes());
-        EXPECT_THAT(fake::calls(), ElementsAre(kLink, kCreate));
-        patterned_area();
-        EXPECT_NE(output_of(row, 0), Bytes());
-
-        g_bt_hfp_share = {};
-        fake::fail_only("CreateSemaphore");
-        const size_t before = fake::calls().size();
-        EXPECT_EQ(output_of(row, -1), Bytes());
-        EXPECT_THAT(calls_since(before), ElementsAre(kLink, kCreate));
-        fake::fail_only("");
-        EXPECT_NE(output_of(row, 0), Bytes());
-    }
-}
-
-TEST_F(HandsFreeStatus, QueriesCopyAlsoWhenLockOrUnlockFails)
-{
-    const uint8_t* const area = patterned_area();
-    for (const Query& row : kQueries)
-        for (const char* const failing : {"SemLock", "SemUnlock"}) {
-            fake::fail_only(failing);
-            const size_t before = fake::calls().size();
+    const std::string lock = "SemLock", unlock = "SemUnlock";
+    const struct {
+        const char* failing;
+        bool copied;
+        std::vector<std::string> calls, calls_after; // and of a second query, when nothing fails any more
+    } rows[] = {{"", true, {kLink, kCreate, lock, unlock}, {lock, unlock}},
+                {"SemLock", true, {kLink, kCreate, lock, unlock}, {lock, unlock}},
+                {"SemUnlock", true, {kLink, kCreate, lock, unlock}, {lock, unlock}},
+                {"LinkShareData", false, {kLink, kCreate}, {kLink, lock, unlock}},
+                {"CreateSemaphore", false, {kLink, kCreate}, {kCreate, lock, unlock}}};
+    for (const Query& query : kQueries)
+        for (const auto& row : rows) {
+            SCOPED_TRACE(std::string(query.name) + " " + row.failing);
+            fake::reset();
             g_bt_hfp_share = {};
-            EXPECT_EQ(output_of(row, 0), Bytes(area + row.offset, area + row.offset + row.size)) << failing;
-            EXPECT_THAT(calls_since(before), ElementsAre(kLink, kCreate, "SemLock", "SemUnlock")) << failing;
+            const uint8_t* const area = patterned_area();
+            const Bytes field(area + query.offset, area + query.offset + query.size);
+            fake::fail_only(row.failing);
+            EXPECT_EQ(output_of(query, row.copied ? 0 : -1), row.copied ? field : Bytes());
+            EXPECT_EQ(fake::calls(), row.calls);
+            fake::fail_only("");
+            EXPECT_EQ(output_of(query, 0), field);
+            EXPECT_EQ(calls_since(row.calls.size()), row.calls_after);
+            EXPECT_EQ(fake::held_locks(), 0u);
+            EXPECT_EQ(fake::deepest_lock(), 1u);
+            EXPECT_EQ(fake::stray_unlocks(), row.failing == lock ? 1u : 0u) << "the closing unlock alone";
+            EXPECT_THAT(fake::logs(), IsEmpty());
         }
-    EXPECT_EQ(fake::stray_unlocks(), std::size(kQueries)) << "the closing unlock, once for each failed lock";
 }
 
 TEST_F(HandsFreeStatus, NullOutputsAndCallsThatAreNoneTouchNothing)
@@ -232,44 +207,6 @@ TEST_F(HandsFreeStatus, InitialValuesCoverTheAreaAndNothingElse)
         EXPECT_EQ(output_of(row, 0), Bytes(image.begin() + static_cast<std::ptrdiff_t>(row.offset),
                                            image.begin() + static_cast<std::ptrdiff_t>(row.offset + row.size)))
             << row.name;
-}
-
-// Readers race each other for the first use, and a writer that fills the call list with one value at a time.
-TEST(ThreadsHandsFreeStatus, FirstUseAndReadingAtOnceGiveWholeCallLists)
-{
-    for (int round = 0; round < 20; ++round) {
-        fake::reset();
-        g_bt_hfp_share = {};
-        uint8_t* const area = fake::area(kArea, 1084, 0x01);
-        std::vector<std::thread> threads;
-        threads.emplace_back([area] {
-            for (int value = 2; value < 60; ++value) {
-                if (bt_hfp_ShareMemAccessInit() != 0 || bt_hfp_SemLock() != 0) {
-                    ADD_FAILURE() << "the writer has no lock";
-                    return;
-                }
-                std::memset(area, value, 1084);
-                EXPECT_EQ(bt_hfp_SemUnlock(), 0);
-            }
-        });
-        for (int reader = 0; reader < 8; ++reader)
-            threads.emplace_back([] {
-                for (int time = 0; time < 20; ++time) {
-                    BtHfpCallList list = {};
-                    EXPECT_EQ(BT_SRV_HFP_getCallList(&list), 0);
-                    const auto* const bytes = reinterpret_cast<const uint8_t*>(&list);
-                    EXPECT_NE(bytes[0], 0);
-                    EXPECT_EQ(Bytes(bytes, bytes + sizeof list), Bytes(sizeof list, bytes[0]));
-                }
-            });
-        for (std::thread& thread : threads)
-            thread.join();
-        EXPECT_EQ(g_bt_hfp_share.area, area);
-        EXPECT_EQ(fake::held_locks(), 0u);
-        EXPECT_EQ(fake::deepest_lock(), 1u);
-        EXPECT_EQ(fake::stray_unlocks(), 0u);
-    }
-    g_bt_hfp_share = {};
 }
 
 } // namespace
