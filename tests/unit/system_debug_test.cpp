@@ -163,6 +163,9 @@ TEST_F(SystemDebug, ExportCopiesEveryByteAndSkipsMissingLogs)
     EXPECT_EQ(content(inside + "/bt_stk.log"), "stays");
     EXPECT_EQ(content(inside + "/osapi.log"), "");
 
+    EXPECT_EQ(BT_SRV_requestDebugOutput((fake::root() + "/tmp").c_str()), 0);
+    EXPECT_TRUE(fake::read_file("/tmp/bt_cmn.log") == log) << "in its place already";
+
     write(inside + "/new/bt_cmn.log/in/the/way", ""); // one destination that cannot be opened
     EXPECT_EQ(BT_SRV_requestDebugOutput((folder + "/new").c_str()), 0);
     EXPECT_EQ(content(inside + "/new/osapi.log"), "");
