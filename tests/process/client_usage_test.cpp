@@ -1,6 +1,11 @@
 // btsvc without a unit: what it refuses, and with which exit code.
 #include "client_run.h"
 
+#include "catalogue/print.h"
+#include "catalogue/rows.h"
+
+#include <bt_service/bt_types.h>
+
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
@@ -80,6 +85,15 @@ TEST(Client, HelpNeedsNoUnit)
         const ClientRun run = run_client(absent_domain(), arguments);
         EXPECT_EQ(run.exit_code, 0) << arguments.front();
         EXPECT_THAT(run.out, Not(IsEmpty())) << arguments.front();
+    }
+}
+
+TEST(Client, CallsEveryConnectionRequestOfTheCatalogue)
+{
+    const std::string list = run_client(absent_domain(), {"call", "--list"}).out;
+    for (const catalogue::Row& request : catalogue::requests()) {
+        if (request.process != PNO_BT_CON) continue;
+        EXPECT_THAT(list, HasSubstr(catalogue::id_text(request.id) + "  " + request.name + " "));
     }
 }
 

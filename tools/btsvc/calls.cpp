@@ -33,8 +33,8 @@ std::string similar_calls(const std::string& name)
 std::vector<Call> all_calls()
 {
     std::vector<Call> calls;
-    for (const std::vector<Call>* table : {&connection_calls()})
-        calls.insert(calls.end(), table->begin(), table->end());
+    for (const CallTable& table : {connection_calls()})
+        calls.insert(calls.end(), table.first, table.end);
     return calls;
 }
 

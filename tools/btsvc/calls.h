@@ -21,8 +21,13 @@ struct Call {
     Result result = Result::code; // what the function returns: 0 for success, or a count
 };
 
+struct CallTable {
+    const Call* first;
+    const Call* end;
+};
+
 // One table per profile.
-const std::vector<Call>& connection_calls();
+CallTable connection_calls();
 
 std::vector<Call> all_calls();
 
