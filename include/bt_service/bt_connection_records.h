@@ -14,6 +14,7 @@
 #ifndef BT_SERVICE_BT_CONNECTION_RECORDS_H
 #define BT_SERVICE_BT_CONNECTION_RECORDS_H
 
+#include <bt_service/bt_share_handle.h>
 #include <bt_service/bt_types.h>
 
 /* Names under which the processes share the area and its lock, and the file that mirrors the persistent part. */
@@ -216,13 +217,7 @@ typedef struct BtConProfileFilter {
 BT_ASSERT_SIZE(BtConProfileFilter, 4);
 BT_ASSERT_AT(BtConProfileFilter, count, 0);
 
-/** What this process is attached to. Local to the process: two native words, never in shared memory. */
-typedef struct BtConShareHandle {
-    uint32_t semaphore;              /* first word   handle of the area's lock; 0 none yet */
-    BtConShareData *area;            /* second word  null while not attached               */
-} BtConShareHandle;
-BT_ASSERT(sizeof(BtConShareHandle) == 2 * sizeof(void *), BtConShareHandle_size);
-BT_ASSERT_AT(BtConShareHandle, semaphore, 0);
-BT_ASSERT_AT(BtConShareHandle, area, sizeof(void *));
+/** What this process is attached to; `area` points to a BtConShareData. */
+typedef struct share_handle BtConShareHandle;
 
 #endif

@@ -19,6 +19,7 @@
 #include <bt_service/bt_message.h>
 #include <bt_service/bt_message_access.h>
 #include <bt_service/bt_object_push.h>
+#include <bt_service/bt_share_handle.h>
 #include <bt_service/bt_shared_memory.h>
 #include <bt_service/bt_state_machine.h>
 #include <bt_service/bt_system.h>

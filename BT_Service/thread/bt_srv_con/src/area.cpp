@@ -24,7 +24,7 @@ int32_t link_area()
     const int32_t result = _sys_LinkShareData(BT_CON_SHARE_DATA_NAME, &linked, &any_size);
     if (result != BT_OK) return result;
 
-    __atomic_store_n(&g_bt_con_share.area, static_cast<BtConShareData*>(linked), __ATOMIC_RELEASE);
+    __atomic_store_n(&g_bt_con_share.area, linked, __ATOMIC_RELEASE);
     return BT_OK;
 }
 
@@ -37,7 +37,7 @@ bool usable(const void* field, const void* buffer, uint32_t size)
 
 BtConShareData* area()
 {
-    return __atomic_load_n(&g_bt_con_share.area, __ATOMIC_ACQUIRE);
+    return static_cast<BtConShareData*>(__atomic_load_n(&g_bt_con_share.area, __ATOMIC_ACQUIRE));
 }
 
 } // namespace bt::con
