@@ -160,6 +160,18 @@ bool lock_creation(int fd, short type)
     return fcntl(fd, F_SETLKW, &lock) == 0;
 }
 
+// A program may run with a standard stream closed. An object that took its descriptor would be written into by whatever
+// the program prints.
+int above_standard_streams(int fd)
+{
+    if (fd < 0 || fd > STDERR_FILENO) return fd;
+    const int moved = fcntl(fd, F_DUPFD_CLOEXEC, STDERR_FILENO + 1);
+    const int error = errno;
+    close(fd);
+    errno = error;
+    return moved;
+}
+
 bool is_ready(int fd)
 {
     uint32_t ready = 0;
@@ -197,7 +209,7 @@ ObjectName object_name(const char* domain, Kind kind, const char* name)
 
 Opening open_object(const ObjectName& name, Kind kind, uint32_t size, Object* object)
 {
-    const int fd = shm_open(name.text, O_RDWR, 0);
+    const int fd = above_standard_streams(shm_open(name.text, O_RDWR, 0));
     if (fd < 0) return errno == ENOENT ? Opening::absent : refuse_call(name, "shm_open", errno);
 
     const Opening opening = check_and_map(name, kind, size, fd, object);
@@ -207,7 +219,7 @@ Opening open_object(const ObjectName& name, Kind kind, uint32_t size, Object* ob
 
 Opening create_object(const ObjectName& name, Kind kind, uint32_t size, Object* object)
 {
-    const int fd = shm_open(name.text, O_RDWR | O_CREAT | O_EXCL, kMode);
+    const int fd = above_standard_streams(shm_open(name.text, O_RDWR | O_CREAT | O_EXCL, kMode));
     if (fd < 0) return errno == EEXIST ? Opening::absent : refuse_call(name, "shm_open", errno);
 
     int error = fchmod(fd, kMode) == 0 && lock_creation(fd, F_WRLCK) ? 0 : errno; // whatever the umask is

@@ -289,5 +289,16 @@ TEST_F(PlatformObjects, NoContentOfTheDomainMisleads)
     }));
 }
 
+TEST_F(PlatformObjects, WhatIsPrintedIntoAClosedStreamReachesNoObject)
+{
+    EXPECT_TRUE(in_child([] {
+        for (const int stream : {STDIN_FILENO, STDOUT_FILENO, STDERR_FILENO})
+            close(stream);
+        EXPECT_EQ(bt_host_claim_pno(kPno + 1), 0);
+        for (const int stream : {STDIN_FILENO, STDOUT_FILENO, STDERR_FILENO})
+            EXPECT_EQ(write(stream, "!", 1), -1);
+    }));
+}
+
 } // namespace
 } // namespace platform_test
