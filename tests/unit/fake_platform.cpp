@@ -56,12 +56,20 @@ struct State {
     int32_t send_answer = 0, timer_answer = 0, receive_answer = 0;
     uint32_t counted = 0, fail_nth = 0, fail_from = 0;
     std::string fail_only;
+    std::function<void()> at_send;
     uint32_t deepest = 0, stray = 0;
     jmp_buf* exit_target = nullptr;
     int32_t exit_code = 0;
 };
 
 constexpr uint32_t kFirstHandle = 0x100;
+
+thread_local int depth = 0;
+
+struct Inside {
+    Inside() { ++depth; }
+    ~Inside() { --depth; }
+};
 
 State& state()
 {
@@ -98,6 +106,7 @@ uint8_t* map_guarded(uint32_t size)
         std::perror("fake platform: mmap");
         std::abort();
     }
+    std::lock_guard<std::recursive_mutex> guard(state().mutex);
     state().mappings.push_back({base, body + 2 * page});
     return static_cast<uint8_t*>(base) + page + body - size;
 }
@@ -145,6 +154,7 @@ void reset()
     s.send_answer = s.timer_answer = s.receive_answer = 0;
     s.counted = s.fail_nth = s.fail_from = 0;
     s.fail_only.clear();
+    s.at_send = nullptr;
     s.deepest = s.stray = 0;
 }
 
@@ -181,6 +191,10 @@ void answer_timer(int32_t result)
 {
     state().timer_answer = result;
 }
+void at_send(std::function<void()> look)
+{
+    state().at_send = std::move(look);
+}
 void incoming(const Bytes& message)
 {
     state().incoming.push_back(message);
@@ -210,6 +224,10 @@ uint32_t counted_calls()
 {
     return state().counted;
 }
+bool inside()
+{
+    return depth > 0;
+}
 
 uint8_t* area(const std::string& name, uint32_t size, uint8_t fill)
 {
@@ -232,6 +250,11 @@ void remove_area(const std::string& name)
 void report_size(const std::string& name, uint32_t size)
 {
     state().areas[name].reported = size;
+}
+
+void null_area(const std::string& name)
+{
+    state().areas[name] = {nullptr, UINT32_MAX, 0};
 }
 
 uint8_t* guarded(uint32_t size, uint8_t fill)
@@ -351,15 +374,18 @@ using namespace fake;
 
 int32_t _sys_SndMsg(uint32_t pno, uint32_t size, const void* message, uint32_t zero)
 {
+    const Inside inside_platform;
     std::lock_guard<std::recursive_mutex> guard(state().mutex);
     if (fails("SndMsg")) return kSendFailure;
     const auto* const bytes = static_cast<const uint8_t*>(message);
     state().posts.push_back({pno, zero, Bytes(bytes, bytes + size)});
+    if (state().at_send) state().at_send();
     return state().send_answer;
 }
 
 int32_t _sys_RcvMsg(uint32_t own_pno, uint32_t size, void* buffer, uint32_t)
 {
+    const Inside inside_platform;
     std::lock_guard<std::recursive_mutex> guard(state().mutex);
     if (fails("RcvMsg", std::to_string(own_pno) + "," + std::to_string(size))) return -1;
     if (state().incoming.empty()) return state().receive_answer;
@@ -386,6 +412,7 @@ void _sys_Exit(int32_t code)
 
 uint32_t _sys_CreateSemaphore(const char* name)
 {
+    const Inside inside_platform;
     std::lock_guard<std::recursive_mutex> guard(state().mutex);
     if (fails("CreateSemaphore", name)) return 0;
     if (lock_handle(name) == 0) state().locks.push_back({name, false, {}});
@@ -394,6 +421,7 @@ uint32_t _sys_CreateSemaphore(const char* name)
 
 int32_t _sys_SemLock(uint32_t handle)
 {
+    const Inside inside_platform;
     std::unique_lock<std::recursive_mutex> guard(state().mutex);
     const std::thread::id self = std::this_thread::get_id();
     if (fails("SemLock") || lock_of(handle) == nullptr) return kLockFailure;
@@ -409,6 +437,7 @@ int32_t _sys_SemLock(uint32_t handle)
 
 int32_t _sys_SemUnlock(uint32_t handle)
 {
+    const Inside inside_platform;
     std::lock_guard<std::recursive_mutex> guard(state().mutex);
     Lock* const lock = lock_of(handle);
     const bool failing = fails("SemUnlock");
@@ -423,38 +452,41 @@ int32_t _sys_SemUnlock(uint32_t handle)
 
 int32_t _sys_LinkShareData(const char* name, void** address, uint32_t* size)
 {
+    const Inside inside_platform;
     std::lock_guard<std::recursive_mutex> guard(state().mutex);
     state().sizes_asked.push_back(*size);
     const auto found = state().areas.find(name);
-    if (fails("LinkShareData", name) || found == state().areas.end() || *size > found->second.size) {
-        *address = nullptr;
-        return kLinkFailure;
-    }
-    *address = found->second.at;
+    const bool failing = fails("LinkShareData", name), found_one = found != state().areas.end();
+    *address = found_one ? found->second.at : nullptr; // also when the result says that it failed
+    if (failing || !found_one || *size > found->second.size) return kLinkFailure;
     *size = found->second.reported;
     return 0;
 }
 
 int32_t _sys_ReqTimerStart(uint32_t pno, uint32_t timer_id, uint32_t two, uint32_t time)
 {
+    const Inside inside_platform;
     state().timers.push_back({"start", pno, timer_id, two, time});
     return fails("ReqTimerStart") ? kTimerFailure : state().timer_answer;
 }
 
 int32_t _sys_TimerStop(uint32_t pno, uint32_t timer_id, uint32_t two)
 {
+    const Inside inside_platform;
     state().timers.push_back({"stop", pno, timer_id, two, 0});
     return fails("TimerStop") ? kTimerFailure : state().timer_answer;
 }
 
 int32_t _sys_SetupZX44API(uint32_t value)
 {
+    const Inside inside_platform;
     state().calls.push_back("SetupZX44API(" + std::to_string(value) + ")");
     return 0;
 }
 
 void QvLog(uint32_t facility, uint32_t zone, const char* tag, const char* format, ...)
 {
+    const Inside inside_platform;
     va_list arguments;
     va_start(arguments, format);
     std::lock_guard<std::recursive_mutex> guard(state().mutex);
@@ -464,12 +496,14 @@ void QvLog(uint32_t facility, uint32_t zone, const char* tag, const char* format
 
 void QvLogSetProcessName(const char* name)
 {
+    const Inside inside_platform;
     std::lock_guard<std::recursive_mutex> guard(state().mutex);
     state().logs.push_back({"QvLogSetProcessName", {}, "", name});
 }
 
 void QvLogSetZones(int32_t count, ...)
 {
+    const Inside inside_platform;
     LogRecord record{"QvLogSetZones", {count}, "", ""};
     va_list arguments;
     va_start(arguments, count);
@@ -482,6 +516,7 @@ void QvLogSetZones(int32_t count, ...)
 
 void ZelLog(int32_t level, int32_t line, const char* function, const char* format, ...)
 {
+    const Inside inside_platform;
     va_list arguments;
     va_start(arguments, format);
     std::lock_guard<std::recursive_mutex> guard(state().mutex);

@@ -52,6 +52,7 @@ const std::vector<uint32_t>& sizes_asked(); // size word of each LinkShareData o
 void set_pno(uint32_t pno);
 void answer_send(int32_t result); // of every following _sys_SndMsg; default 0
 void answer_timer(int32_t result); // of both timer calls; default 0
+void at_send(std::function<void()> look); // run by every following _sys_SndMsg
 void incoming(const Bytes& message); // queued for _sys_RcvMsg, which answers 1
 void answer_receive(int32_t result); // of _sys_RcvMsg when nothing is queued; default 0
 
@@ -61,6 +62,7 @@ void fail_nth(uint32_t n);
 void fail_from(uint32_t n);
 void fail_only(const char* call); // every call of that name, e.g. "SemLock"
 uint32_t counted_calls();
+bool inside(); // the calling thread runs code of this platform
 
 enum : int32_t { kSendFailure = -1, kLockFailure = 51, kUnlockFailure = 52, kLinkFailure = 53, kTimerFailure = 54 };
 
@@ -71,6 +73,7 @@ uint8_t* area(const std::string& name, uint32_t size, uint8_t fill = 0);
 uint8_t* find_area(const std::string& name); // null when there is none
 void remove_area(const std::string& name); // linking it fails from now on
 void report_size(const std::string& name, uint32_t size); // what the size word of a link answers instead
+void null_area(const std::string& name); // linking it succeeds, but yields no address
 
 // Memory of `size` bytes between two unreadable pages, ending right at the second; for the caller's buffers.
 // Lives until reset().
