@@ -8,7 +8,7 @@ int main(void)
     BtDevAddress phone = {{0x00, 0x1A, 0x7D, 0xDA, 0x71, 0x11}, {0, 0}};
     uint32_t parameters[7] = {1, 0, 0, 0, 0, 0, 0};
     uint32_t mode = 99;
-    int32_t posted = BT_SRV_CON_requestConnection(&phone, (const void *)parameters);
+    int32_t posted = BT_SRV_CON_requestConnection(&phone, (const void*)parameters);
     int32_t queried = BT_SRV_CON_getScanMode(&mode);
     uint32_t handle = BT_SRV_EvtSrv_regist(0x4000, 0, 1, &mode);
 
