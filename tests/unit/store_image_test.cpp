@@ -142,14 +142,18 @@ TEST(StoreImage, WriteRewritesTheFileInPlace)
 
 TEST(StoreImage, ShortWriteIsReported)
 {
-    EXPECT_TRUE(fake::in_child([] {
-        attached_process(sample_data());
-        fake::write_file(kImagePath, {});
-        signal(SIGXFSZ, SIG_IGN);
-        const rlimit limit = {19159, 19159};
-        ASSERT_EQ(setrlimit(RLIMIT_FSIZE, &limit), 0);
-        EXPECT_EQ(bt_con_writeFROM(), -1);
-    }));
+    attached_process(sample_data());
+    fake::write_file(kImagePath, {});
+    rlimit usual{};
+    ASSERT_EQ(getrlimit(RLIMIT_FSIZE, &usual), 0);
+    rlimit tight = usual;
+    tight.rlim_cur = kImageSize - 1;
+    const auto handler = signal(SIGXFSZ, SIG_IGN);
+    ASSERT_EQ(setrlimit(RLIMIT_FSIZE, &tight), 0);
+    const int32_t result = bt_con_writeFROM();
+    setrlimit(RLIMIT_FSIZE, &usual);
+    signal(SIGXFSZ, handler);
+    EXPECT_EQ(result, -1);
 }
 
 TEST(StoreImage, ResetOverwritesThePersistentPart)
