@@ -21,6 +21,7 @@ using testing::ElementsAre;
 const char* const kMessage = "/tmp/shm_map_getmsg";
 const char* const kPush = "/tmp/shm_map_pushmsg";
 const char* const kInstances = "/tmp/shm_map_insinfo";
+const char* const kObject = "BT_SRV_MAP_SERVICE_INFO";
 
 uint8_t pattern(size_t i)
 {
@@ -326,6 +327,7 @@ TEST(MessageAccessResults, InstancesAreCopiedWithTheirNames)
         EXPECT_EQ(fake::to_hex(Bytes(list, list + expected.size())), fake::to_hex(expected));
         EXPECT_THAT(fake::sizes_asked(), ElementsAre(940u));
     }
+    shm_unlink(kObject);
 }
 
 TEST(MessageAccessResults, InstancesNeedTheirAreaButNotTheObject)
@@ -338,14 +340,13 @@ TEST(MessageAccessResults, InstancesNeedTheirAreaButNotTheObject)
     fake::area(kInstances, 940, 0);
     EXPECT_EQ(BT_SRV_MAP_getMasServiceInfo(nullptr), -1);
 
-    const char* const name = "BT_SRV_MAP_SERVICE_INFO";
     const int next = dup(0);
     close(next);
     int object = -1;
     for (int i = 0; object < 0 && i < 100; ++i) { // another run of this test may remove it in between
-        shm_unlink(name);
+        shm_unlink(kObject);
         EXPECT_EQ(BT_SRV_MAP_getMasServiceInfo(list), 0);
-        object = shm_open(name, O_RDWR, 0);
+        object = shm_open(kObject, O_RDWR, 0);
     }
     EXPECT_EQ(object, next) << "created, and no descriptor is left open";
     const mode_t mask = umask(0);
@@ -354,7 +355,7 @@ TEST(MessageAccessResults, InstancesNeedTheirAreaButNotTheObject)
     fstat(object, &status);
     EXPECT_EQ(status.st_mode & 0777u, 0777u & ~mask);
     close(object);
-    shm_unlink(name);
+    shm_unlink(kObject);
 
     EXPECT_TRUE(fake::in_child([&] { // where no descriptor can be had
         const rlimit none = {0, 0};

@@ -4,6 +4,7 @@
 #include <bt_service/bt_service.h>
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
+#include <sys/mman.h>
 #include <unistd.h>
 
 #include <array>
@@ -184,6 +185,7 @@ TEST_F(NoHeap, QueriesAndResults)
                        BT_SRV_MAP_getMessageListData(&word, out), BT_SRV_MAP_getFolderListData_ex(3, &word, out),
                        BT_SRV_MAP_getMasServiceInfo(out), BT_SRV_MAP_setPushMessageData(push));
     });
+    shm_unlink("BT_SRV_MAP_SERVICE_INFO");
 }
 
 TEST_F(NoHeap, DataStore)
