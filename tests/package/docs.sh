@@ -23,6 +23,6 @@ for command in $(grep -ohE '\bscripts/[a-z]+(\.txt)?' README.md CONTRIBUTING.md 
   [ -f "$command" ] || { echo "$command is named in the documents and does not exist"; status=1; }
 done
 for script in demo test setup check size layout format; do
-  "scripts/$script" --help | grep -q usage || { echo "scripts/$script --help shows no usage"; status=1; }
+  [[ $("scripts/$script" --help) == *usage* ]] || { echo "scripts/$script --help shows no usage"; status=1; }
 done
 exit $status

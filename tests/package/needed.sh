@@ -11,7 +11,7 @@ check() { # file, SONAME, allowed NEEDED
   while read -r needed; do
     [[ $needed =~ ^($3)$ ]] || { echo "$1 needs $needed"; status=1; }
   done < <("$readelf" -d "$1" | sed -n 's/.*(NEEDED).*\[\(.*\)\]/\1/p')
-  if "$readelf" -d "$1" | grep -q SYMBOLIC; then
+  if [[ $("$readelf" -d "$1") == *SYMBOLIC* ]]; then
     echo "$1 binds its own symbols: exported data could not be interposed"
     status=1
   fi
