@@ -4,46 +4,40 @@
 
 #include <bt_service/bt_events.h>
 #include <bt_service/bt_message.h>
-#include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
 #include <algorithm>
 #include <cstring>
-#include <functional>
 #include <numeric>
 
 namespace {
 
-using testing::ElementsAre;
+using fake::Bytes;
 
 const char* const kTable = "/tmp/shm_eds_regist_table";
-const char* const kLock = "BT_SRV_EDS_SEM_NAME";
 
-// The first test of this file: handles that a process creates once must not be there yet.
-TEST(EventsBeforeFirstUse, SemaphoreIsCreatedOnFirstUseOrRefused)
+// Shuffled or not, suites of such a name run before all others: what a process creates once must not be there yet.
+TEST(EventsDeathTest, SemaphoreIsCreatedOnFirstUseOrRefused)
 {
-    fake::reset();
-    fake::area(kTable, 8004);
-    ASSERT_TRUE(fake::in_child([] {
-        LogCapture log;
-        BtMessage message{};
-        fake::fail_only("CreateSemaphore");
-        BT_EDS_initialize();
-        EXPECT_THAT(LogCapture::texts(),
-                    ElementsAre("EDS|[START] BT_EDS_initialize", "EDS| BT_EDS_initialize _sys_CreateSemaphore ERROR"));
+    EXPECT_TRUE(fake::in_child([] {
+        fake::reset();
+        fake::area(kTable, 8004);
+        const BtMessage message{};
         const uint32_t id = 1;
+        fake::fail_only("CreateSemaphore");
+        EXPECT_EQ(logged("EDS", BT_EDS_initialize),
+                  (Lines{"[START] BT_EDS_initialize", " BT_EDS_initialize _sys_CreateSemaphore ERROR"}));
         EXPECT_EQ(BT_SRV_EvtSrv_regist(1, 1, 1, &id), 0u);
         fake::fail_only("");
         BT_EDS_dispatch(0, &message); // dispatch never creates the lock
         EXPECT_TRUE(fake::posts().empty());
-        EXPECT_EQ(fake::lock_handle(kLock), 0u);
+        EXPECT_EQ(fake::lock_handle("BT_SRV_EDS_SEM_NAME"), 0u);
         BT_SRV_EvtSrv_suspend(5); // the listener side does
-        EXPECT_NE(fake::lock_handle(kLock), 0u);
+        EXPECT_NE(fake::lock_handle("BT_SRV_EDS_SEM_NAME"), 0u);
+        BT_EDS_initialize();
+        BT_EDS_initialize();
         EXPECT_EQ(fake::held_locks(), 0u);
-        BT_EDS_initialize();
-        BT_EDS_initialize();
-        const auto& calls = fake::calls();
-        EXPECT_EQ(std::count(calls.begin(), calls.end(), "CreateSemaphore(BT_SRV_EDS_SEM_NAME)"), 4)
+        EXPECT_EQ(std::count(fake::calls().begin(), fake::calls().end(), "CreateSemaphore(BT_SRV_EDS_SEM_NAME)"), 4)
             << "two refused, then one for each side";
     }));
 }
@@ -51,86 +45,65 @@ TEST(EventsBeforeFirstUse, SemaphoreIsCreatedOnFirstUseOrRefused)
 // The table's bytes, addressed by offset.
 class Events : public testing::Test {
 protected:
-    void SetUp() override
+    Events()
     {
         fake::reset();
         table_ = fake::area(kTable, 8004, 0xCC);
         BT_EDS_initialize();
     }
-    uint32_t word(size_t offset) const
+    Bytes bytes(size_t at = 0, size_t size = 8004) const { return Bytes(table_ + at, table_ + at + size); }
+    static uint32_t add(uint32_t count = 1, const uint32_t* ids = &kId)
     {
-        uint32_t value;
-        std::memcpy(&value, table_ + offset, sizeof value);
-        return value;
+        return BT_SRV_EvtSrv_regist(0x12345678, 0xCAFE, count, ids);
     }
-    void set(size_t offset, uint32_t value) { std::memcpy(table_ + offset, &value, sizeof value); }
-    static size_t entry(uint32_t index) { return 4 + 160 * index; }
-    fake::Bytes snapshot() const { return fake::Bytes(table_, table_ + 8004); }
-    static uint32_t add(uint32_t pno = 0x4001)
-    {
-        const uint32_t ids[] = {0xA881};
-        return BT_SRV_EvtSrv_regist(pno, 0, 1, ids);
-    }
-    uint8_t* table_ = nullptr;
+    static constexpr uint32_t kId = 0xA881;
+    uint8_t* table_;
 };
-
-TEST_F(Events, InitializeClearsTheTable)
-{
-    EXPECT_EQ(word(0), 1u);
-    EXPECT_EQ(snapshot(), [] {
-        fake::Bytes bytes(8004, 0);
-        bytes[0] = 1;
-        return bytes;
-    }());
-    add();
-    BT_EDS_initialize();
-    EXPECT_EQ(word(0), 1u);
-    EXPECT_EQ(word(entry(0)), 0u);
-    EXPECT_EQ(fake::held_locks(), 0u);
-}
 
 TEST_F(Events, RegistrationFillsTheFirstFreeEntry)
 {
+    const Bytes empty = fake::hex("01 00*8003");
+    EXPECT_EQ(bytes(), empty);
     std::vector<uint32_t> ids(40);
     std::iota(ids.begin(), ids.end(), 0xA881u);
-    EXPECT_EQ(BT_SRV_EvtSrv_regist(0x12345678, 0xCAFE, 40, ids.data()), 1u);
+    EXPECT_EQ(add(40, ids.data()), 1u);
     EXPECT_EQ(BT_SRV_EvtSrv_regist(0x4002, 7, 0, ids.data()), 2u);
-    EXPECT_EQ(word(0), 3u);
-    EXPECT_EQ(fake::Bytes(table_ + 4, table_ + 4 + 20), fake::hex("01000000 7856 0000 FECA0000 01000000 23000000"));
-    EXPECT_EQ(std::memcmp(table_ + entry(0) + 20, ids.data(), 35 * 4), 0);
-    EXPECT_EQ(fake::Bytes(table_ + entry(1), table_ + entry(1) + 24),
-              fake::hex("02000000 0240 0000 07000000 01000000 00000000 00000000"));
+    EXPECT_EQ(bytes(0, 24), fake::hex("03000000 01000000 7856 0000 FECA0000 01000000 23000000"));
+    EXPECT_EQ(std::memcmp(table_ + 24, ids.data(), 35 * 4), 0);
+    EXPECT_EQ(bytes(164, 24), fake::hex("02000000 0240 0000 07000000 01000000 00000000 00000000"));
 
     BT_SRV_EvtSrv_deregist(1);
-    EXPECT_EQ(fake::Bytes(table_ + entry(0), table_ + entry(1)), fake::Bytes(160, 0));
+    EXPECT_EQ(bytes(4, 160), Bytes(160, 0));
     EXPECT_EQ(add(), 3u);
-    EXPECT_EQ(word(entry(0)), 3u);
+    EXPECT_EQ(bytes(4, 4), fake::hex("03 00 00 00"));
+    BT_EDS_initialize();
+    EXPECT_EQ(bytes(), empty);
 }
 
 TEST_F(Events, CountsAndNullsAtTheirLimits)
 {
-    std::vector<uint32_t> ids(35, 9);
     const struct {
-        uint32_t count;
-        uint32_t stored;
+        uint32_t count, stored;
         bool accepted;
-    } rows[] = {{0, 0, true},   {1, 1, true},           {34, 34, true},          {35, 35, true},
-                {36, 35, true}, {0x7FFFFFFF, 35, true}, {0x80000000u, 0, false}, {0xFFFFFFFFu, 0, false}};
+    } rows[] = {{0, 0, true}, {35, 35, true}, {36, 35, true}, {0x7FFFFFFF, 35, true}, {0x80000000u, 0, false}};
     for (const auto& row : rows) {
         // The caller's list may end right behind the ids that are taken.
-        uint8_t* const list = fake::guarded(4 * std::max(row.stored, 1u));
-        const fake::Bytes before = snapshot();
-        const uint32_t handle = BT_SRV_EvtSrv_regist(1, 2, row.count, reinterpret_cast<const uint32_t*>(list));
+        const void* const list = fake::guarded(4 * std::max(row.stored, 1u));
+        const Bytes before = bytes();
+        const uint32_t handle = add(row.count, static_cast<const uint32_t*>(list));
         EXPECT_EQ(handle != 0, row.accepted) << row.count;
         if (row.accepted) {
-            EXPECT_EQ(word(entry(0) + 16), row.stored);
+            EXPECT_EQ(table_[20], row.stored);
             BT_SRV_EvtSrv_deregist(handle);
         } else {
-            EXPECT_EQ(snapshot(), before);
+            EXPECT_EQ(bytes(), before);
         }
     }
-    EXPECT_EQ(BT_SRV_EvtSrv_regist(1, 2, 1, nullptr), 0u);
-    set(0, 0);
+    EXPECT_EQ(add(1, nullptr), 0u);
+    fake::report_size(kTable, 8003);
+    EXPECT_EQ(add(), 0u) << "too small a table";
+    fake::report_size(kTable, 8004);
+    std::memset(table_, 0, 4);
     EXPECT_EQ(add(), 0u) << "not initialised";
 }
 
@@ -138,92 +111,63 @@ TEST_F(Events, FiftyListenersFit)
 {
     for (uint32_t i = 1; i <= 50; ++i)
         EXPECT_EQ(add(), i);
-    const fake::Bytes full = snapshot();
+    const Bytes full = bytes();
     EXPECT_EQ(add(), 0u);
-    EXPECT_EQ(snapshot(), full);
-    EXPECT_EQ(find_HdlList(50), static_cast<void*>(table_ + entry(49)));
+    EXPECT_EQ(bytes(), full);
+    EXPECT_EQ(find_HdlList(50), static_cast<void*>(table_ + 4 + 160 * 49));
     EXPECT_EQ(find_HdlList(51), nullptr);
     EXPECT_EQ(find_HdlList(0), nullptr);
     BT_SRV_EvtSrv_deregist(20);
-    EXPECT_EQ(find_HdlList(0), static_cast<void*>(table_ + entry(19)));
+    EXPECT_EQ(find_HdlList(0), static_cast<void*>(table_ + 4 + 160 * 19));
 }
 
 TEST_F(Events, SuspendAndResumeTouchOnlyTheFlag)
 {
     add();
-    const uint32_t handle = add(0x4002);
-    fake::Bytes expected = snapshot();
+    const uint32_t handle = add();
+    Bytes expected = bytes();
     BT_SRV_EvtSrv_suspend(handle);
-    expected[entry(1) + 12] = 0;
-    EXPECT_EQ(snapshot(), expected);
+    expected[164 + 12] = 0;
+    EXPECT_EQ(bytes(), expected);
     BT_SRV_EvtSrv_resume(handle);
-    expected[entry(1) + 12] = 1;
-    EXPECT_EQ(snapshot(), expected);
-    for (void (*change)(uint32_t) : {BT_SRV_EvtSrv_suspend, BT_SRV_EvtSrv_resume, BT_SRV_EvtSrv_deregist}) {
+    expected[164 + 12] = 1;
+    EXPECT_EQ(bytes(), expected);
+    for (void (*change)(uint32_t) : {BT_SRV_EvtSrv_suspend, BT_SRV_EvtSrv_resume, BT_SRV_EvtSrv_deregist})
         change(99);
-        EXPECT_EQ(snapshot(), expected) << "an unknown handle changes nothing";
-    }
+    EXPECT_EQ(bytes(), expected) << "an unknown handle changes nothing";
     BT_SRV_EvtSrv_resume(0);
-    EXPECT_EQ(word(entry(2)), 0u);
-    EXPECT_EQ(word(entry(2) + 12), 1u);
+    EXPECT_EQ(bytes(324, 16), fake::hex("00*12 01 00*3")) << "the first free entry has handle 0";
     EXPECT_EQ(add(), 3u);
-    EXPECT_EQ(word(entry(2)), 3u);
+    EXPECT_EQ(bytes(324, 4), fake::hex("03 00 00 00"));
 }
 
 TEST_F(Events, EveryFailureLeavesTableAndLockAsTheyWere)
 {
+    const BtMessage message{};
     const uint32_t handle = add();
-    const fake::Bytes before = snapshot();
-    struct Row {
-        const char* name;
-        std::function<bool()> call; // true when it reports success
-    };
-    const Row rows[] = {{"regist", [] { return add() != 0; }},
-                        {"deregist",
-                         [&] {
-                             BT_SRV_EvtSrv_deregist(handle);
-                             return false;
-                         }},
-                        {"suspend", [&] {
-                             BT_SRV_EvtSrv_suspend(handle);
-                             return false;
-                         }}};
-    for (const Row& row : rows) {
-        for (const char* failing : {"SemLock", "LinkShareData"}) {
-            for (const bool all_after : {false, true}) {
-                fake::fail_nth(0);
-                const uint32_t first = fake::counted_calls() + (std::strcmp(failing, "SemLock") == 0 ? 1 : 2);
-                all_after ? fake::fail_from(first) : fake::fail_nth(first);
-                EXPECT_FALSE(row.call()) << row.name << failing;
-                EXPECT_EQ(snapshot(), before) << row.name << failing;
-                fake::fail_from(0);
-                fake::fail_nth(0);
+    const Bytes before = bytes();
+    const struct {
+        std::function<void()> call;
+        uint32_t calls; // before the last one, which gives the lock back
+    } rows[] = {{[] { EXPECT_EQ(add(), 0u); }, 2},
+                {[=] { BT_SRV_EvtSrv_deregist(handle); }, 2},
+                {[=] { BT_SRV_EvtSrv_suspend(handle); }, 2},
+                {BT_EDS_initialize, 2},
+                {[&] { BT_EDS_dispatch(0, &message); }, 1}};
+    for (const auto& row : rows)
+        for (void (*fail)(uint32_t) : {fake::fail_nth, fake::fail_from})
+            for (uint32_t n = 1; n <= row.calls; ++n) {
+                SCOPED_TRACE(std::to_string(&row - rows) + ", call " + std::to_string(n));
+                const uint32_t stray = fake::stray_unlocks();
+                fail(n);
+                row.call();
+                fail(0);
+                EXPECT_EQ(bytes(), before);
                 EXPECT_EQ(fake::held_locks(), 0u);
+                EXPECT_EQ(fake::stray_unlocks() - stray, n == 1 ? 1u : 0u) << "a failed lock is unlocked once";
             }
-        }
-        fake::remove_area(kTable);
-        EXPECT_FALSE(row.call());
-        EXPECT_EQ(fake::held_locks(), 0u);
-        table_ = fake::area(kTable, 8004);
-        std::memcpy(table_, before.data(), before.size());
-    }
-    EXPECT_EQ(fake::deepest_lock(), 1u);
-}
-
-TEST_F(Events, FailedLockIsUnlockedOnce)
-{
-    fake::fail_only("SemLock");
-    const uint32_t stray = fake::stray_unlocks();
-    add();
-    EXPECT_EQ(fake::stray_unlocks(), stray + 1);
-    BT_SRV_EvtSrv_suspend(1);
-    EXPECT_EQ(fake::stray_unlocks(), stray + 2);
-    BT_EDS_initialize();
-    EXPECT_EQ(fake::stray_unlocks(), stray + 3);
-    BtMessage message{};
-    BT_EDS_dispatch(0, &message);
-    EXPECT_EQ(fake::stray_unlocks(), stray + 4);
     EXPECT_TRUE(fake::posts().empty());
+    EXPECT_EQ(fake::deepest_lock(), 1u);
 }
 
 TEST_F(Events, DispatchPostsHeaderAndPayloadUnderTheLock)
@@ -231,52 +175,43 @@ TEST_F(Events, DispatchPostsHeaderAndPayloadUnderTheLock)
     BtMessage message{};
     message.msg_header.hdr.cid = 0xA881;
     message.msg_header.hdr.len = 12;
-    LogCapture log;
-    BT_EDS_dispatch(123, &message);
+    EXPECT_EQ(logged("EDS", [&] { BT_EDS_dispatch(123, &message); }),
+              (Lines{"[START] BT_EDS_dispatch", "[END] BT_EDS_dispatch"}));
     ASSERT_EQ(fake::posts().size(), 1u);
     EXPECT_EQ(fake::posts()[0].pno, 0xFF02u);
     EXPECT_EQ(fake::posts()[0].message.size(), 28u);
-    std::vector<std::string> eds;
-    for (const std::string& text : LogCapture::texts())
-        if (text.compare(0, 4, "EDS|") == 0) eds.push_back(text);
-    EXPECT_THAT(eds, ElementsAre("EDS|[START] BT_EDS_dispatch", "EDS|[END] BT_EDS_dispatch"));
-    const auto& calls = fake::calls();
-    EXPECT_THAT(std::vector<std::string>(calls.end() - 3, calls.end()), ElementsAre("SemLock", "SndMsg", "SemUnlock"));
+    EXPECT_EQ(Lines(fake::calls().end() - 3, fake::calls().end()), (Lines{"SemLock", "SndMsg", "SemUnlock"}));
 }
 
 TEST_F(Events, DispatchSideLogsEveryFailure)
 {
-    BtMessage message{};
-    LogCapture log;
-    const auto eds = [] {
-        std::vector<std::string> out;
-        for (const std::string& text : LogCapture::texts())
-            if (text.compare(0, 4, "EDS|") == 0) out.push_back(text.substr(4));
-        return out;
-    };
-    BT_EDS_dispatch(0, nullptr);
-    EXPECT_THAT(eds(), ElementsAre("[START] BT_EDS_dispatch", "[END] BT_EDS_dispatch Param ERROR"));
+    const BtMessage message{};
+    const auto dispatch = [&] { BT_EDS_dispatch(0, &message); };
+    EXPECT_EQ(logged("EDS", [] { BT_EDS_dispatch(0, nullptr); }),
+              (Lines{"[START] BT_EDS_dispatch", "[END] BT_EDS_dispatch Param ERROR"}));
     EXPECT_TRUE(fake::posts().empty());
     fake::answer_send(2);
-    BT_EDS_dispatch(0, &message);
-    EXPECT_THAT(eds(),
-                ElementsAre("[START] BT_EDS_dispatch", "[BT_EDS_dispatch] Send Error= 1", "[END] BT_EDS_dispatch"));
+    EXPECT_EQ(logged("EDS", dispatch),
+              (Lines{"[START] BT_EDS_dispatch", "[BT_EDS_dispatch] Send Error= 1", "[END] BT_EDS_dispatch"}));
     fake::answer_send(0);
-    fake::fail_only("SemLock");
-    BT_EDS_dispatch(0, &message);
-    BT_EDS_initialize();
-    EXPECT_THAT(eds(), ElementsAre("[START] BT_EDS_dispatch", "[END] BT_EDS_dispatch get sem ERROR",
-                                   "[START] BT_EDS_initialize", "[END] BT_EDS_initialize get sem ERROR"));
-    fake::fail_only("SemUnlock");
-    BT_EDS_dispatch(0, &message);
-    BT_EDS_initialize();
-    EXPECT_THAT(eds(),
-                ElementsAre("[START] BT_EDS_dispatch", " BT_EDS_dispatch release sem ERROR", "[END] BT_EDS_dispatch",
-                            "[START] BT_EDS_initialize", " BT_EDS_initialize intialize shared memory",
-                            " BT_EDS_initialize release sem ERROR", "[END] BT_EDS_initialize"));
-    fake::fail_only("LinkShareData");
-    BT_EDS_initialize();
-    EXPECT_THAT(eds(), ElementsAre("[START] BT_EDS_initialize", "[END] BT_EDS_initialize"));
+    const struct {
+        const char* failing;
+        Lines initialize, dispatch;
+    } rows[] = {{"SemLock",
+                 {"[START] BT_EDS_initialize", "[END] BT_EDS_initialize get sem ERROR"},
+                 {"[START] BT_EDS_dispatch", "[END] BT_EDS_dispatch get sem ERROR"}},
+                {"SemUnlock",
+                 {"[START] BT_EDS_initialize", " BT_EDS_initialize intialize shared memory",
+                  " BT_EDS_initialize release sem ERROR", "[END] BT_EDS_initialize"},
+                 {"[START] BT_EDS_dispatch", " BT_EDS_dispatch release sem ERROR", "[END] BT_EDS_dispatch"}},
+                {"LinkShareData",
+                 {"[START] BT_EDS_initialize", "[END] BT_EDS_initialize"},
+                 {"[START] BT_EDS_dispatch", "[END] BT_EDS_dispatch"}}};
+    for (const auto& row : rows) {
+        fake::fail_only(row.failing);
+        EXPECT_EQ(logged("EDS", BT_EDS_initialize), row.initialize) << row.failing;
+        EXPECT_EQ(logged("EDS", dispatch), row.dispatch) << row.failing;
+    }
 }
 
 } // namespace

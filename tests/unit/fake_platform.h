@@ -18,10 +18,9 @@ struct Post {
     uint32_t zero;
     Bytes message; // as many bytes as the call stated
 
-    uint16_t u16(size_t at) const;
-    uint32_t u32(size_t at) const;
-    uint16_t cid() const { return u16(8); }
-    uint16_t length() const { return u16(10); }
+    uint16_t cid() const { return word(8); }
+    uint16_t length() const { return word(10); }
+    uint16_t word(size_t at) const { return static_cast<uint16_t>(message.at(at) | message.at(at + 1) << 8); }
     Bytes payload() const { return Bytes(message.begin() + 16, message.end()); }
 };
 
@@ -32,11 +31,6 @@ struct LogRecord {
     std::string text; // formatted
 };
 
-struct TimerCall {
-    std::string call; // "start" or "stop"
-    uint32_t pno, timer_id, two, time;
-};
-
 // Forgets everything recorded and scripted and removes the shared areas. Lock handles stay what they were, since the
 // library keeps them for the life of the process.
 void reset();
@@ -44,7 +38,6 @@ void reset();
 // ---- what was called
 const std::vector<Post>& posts();
 const std::vector<LogRecord>& logs();
-const std::vector<TimerCall>& timers();
 const std::vector<std::string>& calls(); // every call in order, e.g. "SemLock", "LinkShareData(/tmp/shm_x)"
 const std::vector<uint32_t>& sizes_asked(); // size word of each LinkShareData on entry
 
@@ -58,13 +51,14 @@ void answer_receive(int32_t result); // of _sys_RcvMsg when nothing is queued; d
 
 // Every call of _sys_SndMsg, _sys_RcvMsg, _sys_CreateSemaphore, _sys_SemLock, _sys_SemUnlock, _sys_LinkShareData,
 // _sys_ReqTimerStart, _sys_TimerStop counts, the first being 1. A failing call returns kSendFailure and so on.
+// _sys_Exit ends the test process.
 void fail_nth(uint32_t n);
 void fail_from(uint32_t n);
 void fail_only(const char* call); // every call of that name, e.g. "SemLock"
 uint32_t counted_calls();
 bool inside(); // the calling thread runs code of this platform
 
-enum : int32_t { kSendFailure = -1, kLockFailure = 51, kUnlockFailure = 52, kLinkFailure = 53, kTimerFailure = 54 };
+enum : int32_t { kSendFailure = -1, kLockFailure = 51, kUnlockFailure = 52, kLinkFailure = 53 };
 
 // ---- shared data
 // Creates shared data of `size` bytes, filled with `fill`. It ends at an unreadable page: the first byte behind it
@@ -84,10 +78,6 @@ uint32_t held_locks(); // locks held now
 uint32_t deepest_lock(); // most locks held at once since reset
 uint32_t stray_unlocks(); // unlocks of a lock that was not held
 uint32_t lock_handle(const std::string& name); // 0 when never created
-
-// ---- process
-// Runs `body`; when the library ends the process, returns the code, else nothing.
-std::optional<int32_t> exit_code_of(const std::function<void()>& body);
 
 // Runs `body` in a fork, for what a process does once only. True when no expectation in it failed. The library's
 // state is that of this process at the call, so a test that needs untouched state calls it before touching any.

@@ -5,66 +5,43 @@
 
 #include <cstdarg>
 #include <cstdio>
+#include <functional>
 #include <regex>
 #include <string>
 #include <vector>
 
-struct LogLine {
-    std::string tag, format, text;
-};
+using Lines = std::vector<std::string>;
 
-class LogCapture {
-public:
-    LogCapture() : before_(BT_CMN_logout_wrapperFunc)
-    {
-        lines().clear();
-        BT_CMN_logout_wrapperFunc = record;
-    }
-    ~LogCapture() { BT_CMN_logout_wrapperFunc = before_; }
-    LogCapture(const LogCapture&) = delete;
-    LogCapture& operator=(const LogCapture&) = delete;
+inline Lines g_collected; // each "TAG|text"
 
-    static std::vector<LogLine>& lines()
-    {
-        static std::vector<LogLine> collected;
-        return collected;
-    }
+inline void collect_line(const char* tag, const char* format, ...) BT_PRINTF(2, 3);
+inline void collect_line(const char* tag, const char* format, ...)
+{
+    char text[2048];
+    va_list arguments;
+    va_start(arguments, format);
+    std::vsnprintf(text, sizeof text, format, arguments);
+    va_end(arguments);
+    g_collected.push_back(std::string(tag) + "|" + text);
+}
 
-    // The collected texts, each "TAG|text". Within them "[API][<path>][<function>][<line>]" becomes "[api:<function>]",
-    // "[model:<function>]" or keeps its path when it is neither; the source line is some number above zero.
-    static std::vector<std::string> texts()
-    {
-        static const std::string base = "BT_Service/api/../thread/bt_srv_cmn/utility/src/bt_srv_cmn_";
-        static const std::regex place(R"(\[API\]\[([^\]]*)\]\[([^\]]*)\]\[[1-9][0-9]*\])");
-        std::vector<std::string> out;
-        for (const LogLine& line : lines()) {
-            std::smatch match;
-            std::string text = line.text;
-            if (std::regex_search(text, match, place)) {
-                std::string path = match[1];
-                if (path.compare(0, base.size(), base) == 0) path = path.substr(base.size());
-                text = std::string(match.prefix()) + "[" + path + ":" + std::string(match[2]) + "]" +
-                       std::string(match.suffix());
-            }
-            out.push_back(line.tag + "|" + text);
-        }
-        lines().clear();
-        return out;
-    }
-
-private:
-    static void record(const char* tag, const char* format, ...) BT_PRINTF(2, 3)
-    {
-        char text[2048];
-        va_list arguments;
-        va_start(arguments, format);
-        std::vsnprintf(text, sizeof text, format, arguments);
-        va_end(arguments);
-        lines().push_back({tag, format, text});
-    }
-
-    BT_CMN_logout before_;
-};
+// The lines of that tag which `body` logs. Within them "[API][<path>][<function>][<line>]" becomes "[api:<function>]" or
+// "[model:<function>]"; it stays as it is when the path is neither or the source line is not a number above zero.
+inline Lines logged(const std::string& tag, const std::function<void()>& body)
+{
+    static const std::regex place(R"(\[API\]\[BT_Service/api/\.\./thread/bt_srv_cmn/utility/src/bt_srv_cmn_)"
+                                  R"((api|model)\]\[([^\]]*)\]\[[1-9][0-9]*\])");
+    const BT_CMN_logout before = BT_CMN_logout_wrapperFunc;
+    BT_CMN_logout_wrapperFunc = collect_line;
+    g_collected.clear();
+    body();
+    BT_CMN_logout_wrapperFunc = before;
+    Lines lines;
+    for (const std::string& line : g_collected)
+        if (line.compare(0, tag.size() + 1, tag + "|") == 0)
+            lines.push_back(std::regex_replace(line.substr(tag.size() + 1), place, "[$1:$2]"));
+    return lines;
+}
 
 inline std::string pointer_text(const void* pointer)
 {

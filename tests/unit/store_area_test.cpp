@@ -1,3 +1,4 @@
+// The connection data area: attaching, its lock, the field accessors and what they are made of.
 #include "store_support.h"
 
 #include <cstring>
@@ -9,39 +10,13 @@ namespace {
 
 const std::string kLink = "LinkShareData(" + std::string(kAreaName) + ")";
 const std::string kCreate = "CreateSemaphore(" + std::string(kLockName) + ")";
-const Calls kLocked = {"SemLock", "SemUnlock"};
-
-Bytes sample_data()
-{
-    return device_list("AB") + order_list("A") + profile_orders(2, "BA") + id_list(id_entry('A', 5, 1));
-}
 
 template <auto Function>
 int32_t call(At buffer, uint32_t lock_flag)
 {
     return Function(buffer, lock_flag);
 }
-
-const struct Accessor {
-    int32_t (*get)(At, uint32_t);
-    int32_t (*set)(At, uint32_t);
-    size_t at, size;
-    bool writes_image;
-} kAccessors[] = {
-    {call<bt_con_getRegisteredDeviceListInfo>, call<bt_con_setRegisteredDeviceListInfo>, 0, 17344, true},
-    {call<bt_con_getRegisteredDeviceListInfoNoFROMWrite>, call<bt_con_setRegisteredDeviceListInfoNoFROMWrite>, 0, 17344,
-     false},
-    {call<bt_con_getRegisteredOrderList>, call<bt_con_setRegisteredOrderList>, 17344, 140, true},
-    {call<bt_con_getProfileConnectedOrderList>, call<bt_con_setProfileConnectedOrderList>, 17484, 1120, true},
-    {call<bt_con_getRegisteredDeviceDIDInfoList>, call<bt_con_setRegisteredDeviceDIDInfoList>, 18604, 544, true},
-    {call<bt_con_getSearchDevlist>, call<bt_con_setSearchDevlist>, 19148, 8580, false},
-    {call<bt_con_getConnectSetVal>, call<bt_con_setConnectSetVal>, 27728, 16, false},
-    {call<bt_con_getLinkLossConnectSetVal>, call<bt_con_setLinkLossConnectSetVal>, 27744, 32, false},
-    {call<bt_con_getDiscoverableStatus>, call<bt_con_setDiscoverableStatus>, 27776, 4, false},
-    {call<bt_con_getScanMode>, call<bt_con_setScanMode>, 27780, 4, false},
-    {call<bt_con_getSimplepairingCapability>, call<bt_con_setSimplepairingCapability>, 27784, 8, false},
-    {call<bt_con_getBluetoothSetVal>, call<bt_con_setBluetoothSetVal>, 27792, 4, false},
-};
+#define ACCESSORS(name) call<bt_con_get##name>, call<bt_con_set##name>
 
 Calls calls_of(const std::function<void()>& body)
 {
@@ -76,25 +51,17 @@ TEST(StoreAttach, FirstCallAttachesAndOnlyModeOneLoadsTheImage)
         EXPECT_EQ(bt_con_ApiInit(row.mode), row.result);
         EXPECT_EQ(fake::calls(), row.calls);
         EXPECT_EQ(fake::sizes_asked(), std::vector<uint32_t>{0});
-        EXPECT_EQ(handle_area(), row.failing == 1 ? nullptr : area);
-        EXPECT_EQ(handle_semaphore(), row.result == 0 ? fake::lock_handle(kLockName) : 0u);
+        EXPECT_EQ(static_cast<void*>(g_bt_con_share.area), row.failing == 1 ? nullptr : area);
+        EXPECT_EQ(g_bt_con_share.semaphore, row.result == 0 ? fake::lock_handle(kLockName) : 0u);
         EXPECT_EQ(difference(area_bytes(), row.data + Bytes(kAreaSize - kPersistentSize, 0x5A)), "");
         EXPECT_EQ(fake::held_locks(), 0u);
-    }
-    EXPECT_EQ(static_cast<void*>(bt_con_getShareMemAccessPtr()), static_cast<void*>(&g_bt_con_share));
-}
 
-TEST(StoreAttach, LaterCallsOnlyConfirm)
-{
-    for (const uint32_t modes : {0u, 1u, 2u, 3u}) {
-        fresh_process();
-        fake::write_file(kImagePath, image_of(sample_data()));
-        ASSERT_EQ(bt_con_ApiInit(modes & 1), 0);
-        const Bytes before = area_bytes();
+        if (row.result != 0) continue; // what is attached is only confirmed
         fake::write_file(kImagePath, image_of(Bytes(kPersistentSize, 0x42)));
-        EXPECT_EQ(calls_of([&] { EXPECT_EQ(bt_con_ApiInit(modes / 2), 0); }), Calls{});
-        EXPECT_EQ(difference(area_bytes(), before), "");
+        EXPECT_EQ(calls_of([] { EXPECT_EQ(bt_con_ApiInit(1), 0); }), Calls{});
+        EXPECT_EQ(difference(area_bytes(0, kPersistentSize), row.data), "");
     }
+    EXPECT_EQ(bt_con_getShareMemAccessPtr(), &g_bt_con_share);
 }
 
 TEST(StoreAttach, WithoutSemaphoreNothingIsLockedUntilItCanBeCreated)
@@ -114,13 +81,32 @@ TEST(StoreLock, PassesCodesOnAndReleasesAFailedLockOnce)
     EXPECT_EQ(calls_of([] { EXPECT_EQ(bt_con_semLock(), 0); }), Calls{"SemLock"});
     EXPECT_EQ(calls_of([] { EXPECT_EQ(bt_con_semUnlock(), 0); }), Calls{"SemUnlock"});
     fake::fail_from(1);
-    EXPECT_EQ(calls_of([] { EXPECT_EQ(bt_con_semLock(), fake::kLockFailure); }), kLocked);
+    EXPECT_EQ(calls_of([] { EXPECT_EQ(bt_con_semLock(), fake::kLockFailure); }), (Calls{"SemLock", "SemUnlock"}));
     EXPECT_EQ(calls_of([] { EXPECT_EQ(bt_con_semUnlock(), fake::kUnlockFailure); }), Calls{"SemUnlock"});
 }
 
 TEST(StoreAccessors, CopyExactlyTheirFieldAndWriteTheImageOnChangeOnly)
 {
-    for (const Accessor& accessor : kAccessors) {
+    const struct {
+        int32_t (*get)(At, uint32_t);
+        int32_t (*set)(At, uint32_t);
+        size_t at, size;
+        bool writes_image;
+    } accessors[] = {
+        {ACCESSORS(RegisteredDeviceListInfo), 0, 17344, true},
+        {ACCESSORS(RegisteredDeviceListInfoNoFROMWrite), 0, 17344, false},
+        {ACCESSORS(RegisteredOrderList), 17344, 140, true},
+        {ACCESSORS(ProfileConnectedOrderList), 17484, 1120, true},
+        {ACCESSORS(RegisteredDeviceDIDInfoList), 18604, 544, true},
+        {ACCESSORS(SearchDevlist), 19148, 8580, false},
+        {ACCESSORS(ConnectSetVal), 27728, 16, false},
+        {ACCESSORS(LinkLossConnectSetVal), 27744, 32, false},
+        {ACCESSORS(DiscoverableStatus), 27776, 4, false},
+        {ACCESSORS(ScanMode), 27780, 4, false},
+        {ACCESSORS(SimplepairingCapability), 27784, 8, false},
+        {ACCESSORS(BluetoothSetVal), 27792, 4, false},
+    };
+    for (const auto& accessor : accessors) {
         SCOPED_TRACE("field at " + std::to_string(accessor.at));
         Bytes usual(accessor.size);
         for (size_t i = 0; i < usual.size(); ++i)
@@ -131,54 +117,39 @@ TEST(StoreAccessors, CopyExactlyTheirFieldAndWriteTheImageOnChangeOnly)
         std::vector<Row> rows;
         for (const uint32_t flag : {0u, 1u, 2u}) {
             const Locking locking = flag == 1 ? Locking::kAccessor : Locking::kNone;
-            const std::string with = " with flag " + std::to_string(flag);
-            const auto set = [&](const Bytes& after, Locking locks) {
-                const Call call = [=](At) { return accessor.set(static_cast<void*>(Given(after)), flag); };
-                rows.push_back(change("set" + with, usual, after, call, 0, locks));
+            const Bytes got = usual.size() < 8 ? usual + Bytes(4, 0xA5) : usual;
+            rows.push_back(answer(CALL(accessor.get(out, flag)), got, 0, locking));
+            rows.push_back(refused(-1, CALL(accessor.get(nullptr, flag))));
+            rows.push_back(refused(-1, CALL(accessor.set(nullptr, flag))));
+            for (const Bytes& after : {first, last, usual}) {
+                const Operation set = CALL(accessor.set(static_cast<void*>(Given(after)), flag));
+                rows.push_back(change(set, usual, after, 0, after == usual ? Locking::kNone : locking));
                 rows.back().writes_image = accessor.writes_image;
-            };
-            const Call get = [=](At out) { return accessor.get(out, flag); };
-            rows.push_back(answer("get" + with, get, usual.size() < 8 ? usual + Bytes(4, 0xA5) : usual, 0, locking));
-            rows.push_back(refused("get into null" + with, -1, nulled(get)));
-            rows.push_back(refused("set null" + with, -1, [=](At) { return accessor.set(At(nullptr), flag); }));
-            set(first, locking);
-            set(last, locking);
-            set(usual, Locking::kNone);
+            }
         }
-        run_rows(rows, {accessor.at, accessor.size, usual, {}});
+        run_rows({accessor.at, accessor.size, usual}, rows);
     }
 }
 
 TEST(StoreGetterAndSetter, PassCodesOnAndRefuseWhatTheyCannotCopy)
 {
     const Bytes usual = order_list("AB"), other = order_list("BA");
-    const auto get = [](size_t at, uint32_t size, uint32_t flag) -> Call {
-        return [=](At out) { return bt_con_getter(fake::find_area(kAreaName) + at, out, size, flag); };
+    const auto order = [] { return fake::find_area(kAreaName) + kOrder; };
+    const auto set = [=](uint32_t write_from, uint32_t flag, Locking locking) {
+        return change(CALL(bt_con_setter(order(), Given(other), 140, write_from, flag)), usual, other, 0, locking);
     };
-    const auto set = [&](const Bytes& given, uint32_t size, uint32_t write_from, uint32_t flag) -> Call {
-        return [=](At) {
-            return bt_con_setter(fake::find_area(kAreaName) + kOrder, Given(given), size, write_from, flag);
-        };
-    };
-    std::vector<Row> rows = {
-        answer("get", get(kOrder, 140, 1), usual, 0, Locking::kGeneric),
-        answer("get with flag 2", get(kOrder, 140, 2), usual),
-        answer("get some", get(kOrder + 4, 8, 0), address('A') + Bytes(2, 0x70)),
-        refused("get nothing", -1, get(kOrder, 0, 1)),
-        refused("get into null", -1, nulled(get(kOrder, 140, 1))),
-        refused("get from null", -1, [](At out) { return bt_con_getter(nullptr, out, 8, 1); }),
-        refused("set nothing", -1, set(other, 0, 1, 1)),
-        refused("set null", -1, set({}, 140, 1, 1)),
-        refused("set in null", -1, [](At) { return bt_con_setter(nullptr, Given(Bytes(8)), 8, 1, 1); }),
-        change("set", usual, other, set(other, 140, 1, 1), 0, Locking::kGeneric),
-        change("set with flag 2", usual, other, set(other, 140, 1, 2), 0, Locking::kNone),
-    };
-    for (const uint32_t write_from : {0u, 2u}) {
-        rows.push_back(
-            change("set for the area alone", usual, other, set(other, 140, write_from, 1), 0, Locking::kGeneric));
-        rows.back().writes_image = false;
-    }
-    run_rows(rows, {kOrder, 140, usual, {}});
+    run_rows({kOrder, 140, usual},
+             {answer(CALL(bt_con_getter(order(), out, 140, 1)), usual, 0, Locking::kGeneric),
+              answer(CALL(bt_con_getter(order(), out, 140, 2)), usual),
+              answer(CALL(bt_con_getter(order() + 4, out, 8, 0)), address('A') + Bytes(2, 0x70)),
+              refused(-1, CALL(bt_con_getter(order(), out, 0, 1))),
+              refused(-1, CALL(bt_con_getter(order(), nullptr, 140, 1))),
+              refused(-1, CALL(bt_con_getter(nullptr, out, 8, 1))),
+              refused(-1, CALL(bt_con_setter(order(), Given(other), 0, 1, 1))),
+              refused(-1, CALL(bt_con_setter(order(), nullptr, 140, 1, 1))),
+              refused(-1, CALL(bt_con_setter(nullptr, Given(Bytes(8)), 8, 1, 1))), set(1, 1, Locking::kGeneric),
+              set(1, 2, Locking::kNone), set(0, 1, Locking::kGeneric).unwritten(),
+              set(2, 1, Locking::kGeneric).unwritten()});
 
     attached_process();
     fake::remove_file(kImagePath); // an image that cannot be written is not reported
@@ -191,21 +162,19 @@ TEST(StoreAddress, SixBytesCountAndPaddingStays)
     const struct {
         const char *a, *b;
         int32_t equal, valid; // whether a is an address
-    } rows[] = {
-        {"00*6 00 00", "00*6 01 02", 1, 1},
-        {"FF*6 00 00", "FF*6 FF FF", 1, 0},
-        {"FF*5 FE FF FF", "FF*6 FF FF", 0, 1},
-        {"FE FF*5 FF FF", "FF*6 FF FF", 0, 1},
-    };
+    } rows[] = {{"00*6 00 00", "00*6 01 02", 1, 1},
+                {"FF*6 00 00", "FF*6 FF FF", 1, 0},
+                {"FF*5 FE FF FF", "FF*6 FF FF", 0, 1},
+                {"FE FF*5 FF FF", "FF*6 FF FF", 0, 1}};
     for (const auto& row : rows) {
         SCOPED_TRACE(row.a);
         const Given a(fake::hex(row.a)), b(fake::hex(row.b)), to(Bytes(8, 0x33));
         EXPECT_EQ(bt_con_IsCompBtDevAddress(a, b), row.equal);
         EXPECT_EQ(bt_con_IsValidBtDevAddress(a), row.valid);
-        void* const start = to;
-        EXPECT_EQ(static_cast<void*>(bt_con_copyBtDevAddress(to, a)), start);
+        BtDevAddress* const start = to;
+        EXPECT_EQ(bt_con_copyBtDevAddress(to, a), start);
         EXPECT_EQ(to.bytes(), Bytes(a.bytes().begin(), a.bytes().begin() + 6) + Bytes(2, 0x33));
-        EXPECT_EQ(static_cast<void*>(bt_con_clearBtDevAddress(to)), start);
+        EXPECT_EQ(bt_con_clearBtDevAddress(to), start);
         EXPECT_EQ(to.bytes(), fake::hex("FF*6 33 33"));
     }
 }

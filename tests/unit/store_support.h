@@ -8,9 +8,7 @@
 #include <bt_service/bt_connection_store.h>
 #include <gtest/gtest.h>
 
-#include <functional>
-#include <string>
-#include <vector>
+#include <climits>
 
 namespace store {
 
@@ -22,7 +20,7 @@ enum : size_t { kDevices = 0, kOrder = 17344, kProfileOrders = 17484, kDeviceIds
 constexpr const char* kAreaName = "BT_CON_SHARE_DATA_NAME";
 constexpr const char* kLockName = "BT_CON_SEMAPHORE_NAME";
 constexpr const char* kImagePath = "/fs/tmpfs/btdevicelist.txt";
-inline const std::string kSeventeen = "ABCDEFGHIJKLMNOPQ";
+inline const std::string kSixteen = "ABCDEFGHIJKLMNOP", kSeventeen = kSixteen + "Q";
 
 // Memory for a parameter of any pointer type, so that no row depends on the records of the headers.
 class At {
@@ -39,8 +37,7 @@ private:
     void* memory_;
 };
 
-// Bytes of the caller for a parameter of any pointer type, exactly as long as they are; none are a null
-// pointer.
+// Bytes of the caller for a parameter of any pointer type, exactly as long as they are; none are a null pointer.
 class Given {
 public:
     explicit Given(Bytes bytes) : bytes_(std::move(bytes)) {}
@@ -56,12 +53,14 @@ private:
 };
 
 Bytes words(std::initializer_list<uint32_t> values);
+Bytes word(uint32_t value); // as an output holds it, whose last four bytes are untouched
 Bytes operator+(Bytes left, const Bytes& right);
 void put(Bytes& bytes, size_t at, const Bytes& part);
 Bytes with_count(int32_t count, Bytes list); // the word at its start
 std::string difference(const Bytes& got, const Bytes& want); // empty when there is none
 
-// Slots of devices, named by a letter: 'A' is 41 10 20 30 40 50, '0' is 00 x 6, '-' is FF x 6; EE EF behind each. '?' is null.
+// Slots of devices, named by a letter: 'A' is 41 10 20 30 40 50, '0' is 00 x 6, '-' is FF x 6; EE EF behind each. '?' is
+// a null pointer.
 Given dev(const std::string& letters);
 Bytes address(char letter); // the six bytes
 
@@ -71,9 +70,10 @@ Bytes device_list(const std::string& letters); // words 0x100, 0x200 and 0x300 +
 Bytes order_list(const std::string& letters, bool padded = true); // padding tells every slot
 Bytes profile_orders(size_t profile, const std::string& letters, bool padded = true); // the others hold one device each
 Bytes id_entry(char letter, uint32_t key, uint8_t value, uint32_t key2 = 0, uint8_t value2 = 0);
-Bytes id_list(const Bytes& entries); // followed by empty entries
+Bytes id_list(Bytes entries); // followed by empty entries
 Bytes device_info(char letter, uint8_t fill); // of a found device: name and class of `fill`
 Bytes search_list(const Bytes& infos); // as the store keeps them, padding 0
+Bytes sample_data(); // some of everything that is persistent
 const Bytes& default_data();
 Bytes image_of(const Bytes& data, uint8_t init_request = 0);
 const Bytes& stale_image(); // what the file holds before each run
@@ -82,9 +82,6 @@ const Bytes& stale_image(); // what the file holds before each run
 uint8_t* fresh_process(const Bytes& data = default_data());
 uint8_t* attached_process(const Bytes& data = default_data());
 Bytes area_bytes(size_t at = 0, size_t size = kAreaSize);
-void set_handle(uint32_t semaphore, void* area);
-uint32_t handle_semaphore();
-uint8_t* handle_area();
 
 enum class Locking {
     kNone, // takes no lock
@@ -96,35 +93,39 @@ enum class Locking {
     kAccessor, // the same inside a field accessor, where every failure is -1
 };
 
-using Call = std::function<int32_t(At out)>; // `out` ends at an unreadable page
-
-// One operation: what it finds in its field, what it answers and what it leaves behind.
-struct Row {
+struct Operation {
     std::string what;
-    Call call;
-    int32_t result = 0;
-    Locking locking = Locking::kNone;
+    std::function<int32_t(At out)> call; // `out` ends at an unreadable page
+};
+#define CALL(expression)                                                                                               \
+    {                                                                                                                  \
+#expression, [=]([[maybe_unused]] At out) -> int32_t { return expression; }                                    \
+    }
+
+// An operation, what it answers, what it finds in its field and what it leaves behind.
+struct Row {
+    Operation operation;
+    int32_t result;
+    Locking locking;
     Bytes before{}, after{}; // of the field; empty: as the field usually is, unchanged
     Bytes out{}, out_failed{}; // empty: left untouched
     bool writes_image = true; // when something persistent changed
 
     Row on(Bytes held) { return before = std::move(held), *this; }
+    Row unwritten() { return writes_image = false, *this; }
 };
 
-Row change(const std::string& what, Bytes before, Bytes after, Call call, int32_t result = 0,
-           Locking locking = Locking::kReported);
-Row answer(const std::string& what, Call call, Bytes out, int32_t result = 0, Locking locking = Locking::kNone,
-           Bytes out_failed = {});
-Row refused(const std::string& what, int32_t result, Call call, Locking locking = Locking::kNone);
-Call nulled(Call call); // the call with null for its output
+Row change(Operation operation, Bytes before, Bytes after, int32_t result = 0, Locking locking = Locking::kReported);
+Row answer(Operation operation, Bytes out, int32_t result = 0, Locking locking = Locking::kNone, Bytes out_failed = {});
+Row refused(int32_t result, Operation operation, Locking locking = Locking::kNone);
 
 struct Field {
     size_t at, owned; // nothing but `owned` bytes there may change
     Bytes usual;
-    std::vector<std::pair<size_t, int32_t>> counts; // place and capacity
+    std::vector<std::pair<size_t, int32_t>> counts{}; // place and capacity
+    bool attached = true; // false: the operations attach by themselves
 };
 
-void run_rows(const std::vector<Row>& rows, const Field& field); // in a process that is attached
-void run_query_rows(const std::vector<Row>& rows, const Field& field); // which attach by themselves
+void run_rows(const Field& field, const std::vector<Row>& rows);
 
 } // namespace store

@@ -1,23 +1,28 @@
 // Many threads at once: requests, log, trace, shared areas and their first use. Also run under the thread sanitizer.
-#include "request_rows.h"
+#include "store_support.h"
 
 #include <bt_service/bt_service.h>
 #include <gmock/gmock.h>
 
 #include <array>
 #include <atomic>
+#include <cstring>
 #include <map>
+#include <set>
+#include <sstream>
 #include <thread>
+
+using namespace store;
 
 namespace {
 
-using fake::Bytes;
-
 constexpr uint32_t kThreads = 8;
+constexpr uint32_t kRounds = 100;
+
+using Body = std::function<void(uint32_t)>;
 
 // Runs body(0..7), each in a thread of its own, all let go at the same moment.
-template <class Body>
-void on_threads(Body body)
+void at_once(const Body& body)
 {
     std::atomic<uint32_t> waiting{kThreads};
     std::vector<std::thread> threads;
@@ -32,298 +37,231 @@ void on_threads(Body body)
         thread.join();
 }
 
-// ---- requests
-
-struct Sender {
-    requests::Channel channel;
-    requests::Row row;
-};
-
-// One request through each sender, all bytes of its payload but a length the same.
-std::vector<Sender> senders(uint8_t tag)
-{
-    using requests::call, requests::Given;
-    const std::string v = fake::to_hex({tag}).substr(0, 2) + "*";
-    return {{{0x08C1, 0, 0, nullptr}, {"", 0x1105, v + "256", call(BT_SRV_sendHciCommand, Given(v + "256"))}},
-            {{0x08C2, 0xFF02, 1024, nullptr},
-             {"", 0xA0F3, v + "32", call(BT_SRV_CON_startServiceDiscovery_UUID, Given(v + "8"), Given(v + "24"))}},
-            {{0x08C3, 0, 0, nullptr}, {"", 0x2003, v + "48", call(BT_SRV_HFP_sendATCommand, Given(v + "48"))}},
-            {{0x08C4, 0, 0, nullptr},
-             {"", 0x1024, "01EE " + v + "494", call(BT_SRV_AVP_STRCTL_setDeviceFileName, 494u, Given(v + "494"))}},
-            {{0x08C6, 0, 0, nullptr},
-             {"", 0x30A0, "EE03 " + v + "1006", call(BT_SRV_OPP_pushResponseReq, Given("EE03 " + v + "1006"))}},
-            {{0x08CA, 0, 0, nullptr}, {"", 0x5009, v + "17", call(BT_SRV_MAP_getMessage, Given(v + "20"))}}};
-}
-
-TEST(ThreadsRequests, EveryMessageIsWhole)
-{
-    constexpr uint32_t kRounds = 50;
-    fake::reset();
-    std::map<std::pair<uint32_t, Bytes>, uint32_t> expected, posted;
-    std::vector<std::vector<Sender>> all;
-    for (uint32_t i = 0; i < kThreads; ++i) {
-        all.push_back(senders(static_cast<uint8_t>(0x11 * (i + 1))));
-        for (const Sender& sender : all.back())
-            expected[{sender.channel.pno, requests::message_of(sender.channel, sender.row)}] = kRounds;
-    }
-    on_threads([&](uint32_t i) {
-        for (uint32_t round = 0; round < kRounds; ++round)
-            for (const Sender& sender : all[i])
-                EXPECT_EQ(sender.row.call(), 0);
-    });
-    for (const fake::Post& post : fake::posts())
-        ++posted[{post.pno, post.message}];
-    EXPECT_EQ(posted.size(), expected.size());
-    EXPECT_TRUE(posted == expected);
-}
-
-// ---- log and trace
+// ---- what many threads write at once is whole: the same as when they write one after the other
 
 using Counts = std::map<std::string, uint32_t>;
 
-// Counts the records of a log, their times left out. A record is a line with a time and what follows up to the next.
-Counts records_in(const std::string& log)
+// A record begins with a time, which is left out, or is a line of the trace; the lines of a dump belong to theirs.
+void count_records(const std::string& output, const Bytes& text, Counts& counts)
 {
-    Counts counts;
-    std::istringstream lines(log);
+    std::istringstream lines(std::string(text.begin(), text.end()));
     std::string record;
     for (std::string line; std::getline(lines, line);) {
-        if (line.size() > 24 && line[4] == '/' && line[23] == ' ') {
-            if (!record.empty()) ++counts[record];
-            record = line.substr(24);
-        } else {
-            record += "\n" + line;
+        const bool timed = line.size() > 24 && line[4] == '/' && line[23] == ' ';
+        if (!record.empty() && (timed || line[0] == 'B')) {
+            ++counts[output + record];
+            record.clear();
         }
+        record += timed ? line.substr(24) : line;
     }
-    if (!record.empty()) ++counts[record];
+    if (!record.empty()) ++counts[output + record];
+}
+
+Counts left_by(uint32_t rounds, const std::function<void(const Body&)>& run, const Body& body)
+{
+    fake::reset();
+    fake::remove_file("/tmp/bt_cmn.log");
+    bt_cmn_log_fp_reset(); // the threads find the file not open
+    testing::internal::CaptureStdout();
+    run([&](uint32_t i) {
+        for (uint32_t round = 0; round < rounds; ++round)
+            body(i);
+    });
+    std::fflush(nullptr);
+    const std::string console = testing::internal::GetCapturedStdout();
+    Counts counts;
+    count_records("console ", Bytes(console.begin(), console.end()), counts);
+    count_records("file ", fake::read_file("/tmp/bt_cmn.log").value_or(Bytes()), counts);
+    for (const fake::LogRecord& record : fake::logs())
+        ++counts[record.channel + record.text];
+    for (const fake::Post& post : fake::posts())
+        ++counts[std::to_string(post.pno) + " " + fake::to_hex(post.message)];
     return counts;
 }
 
-// The part of the log file written by `body`, and standard output as it left it.
-std::pair<std::string, std::string> outputs_of(const std::function<void()>& body)
+void expect_whole(size_t distinct, const Body& body)
 {
-    const auto file = [] {
-        std::fflush(bt_cmn_log_fpget());
-        const auto content = fake::read_file("/tmp/bt_cmn.log");
-        return content ? std::string(content->begin(), content->end()) : "";
+    const auto one_by_one = [](const Body& all) {
+        for (uint32_t i = 0; i < kThreads; ++i)
+            all(i);
     };
-    const size_t before = file().size();
-    testing::internal::CaptureStdout();
-    body();
-    std::fflush(stdout);
-    return {file().substr(before), testing::internal::GetCapturedStdout()};
+    Counts expected = left_by(1, one_by_one, body);
+    EXPECT_EQ(expected.size(), kThreads * distinct);
+    for (auto& [record, count] : expected)
+        count *= kRounds;
+    EXPECT_TRUE(left_by(kRounds, at_once, body) == expected);
 }
 
-class ThreadsLog : public testing::Test {
-protected:
-    void SetUp() override
-    {
-        fake::reset();
-        fake::write_file("/fs/rwdata/BT/btstack/BT_SERVICE_DEBUG", {});
-        BT_CMN_DebugLogSelecter();
-        DebugConsoleLogSts = DebugFileOutLogSts = 1;
-    }
-    void TearDown() override
-    {
-        BT_CMN_DebugLogSelecter();
-        DebugSRVOutLogSts = 0;
-        fake::reset();
-    }
-};
-
-TEST_F(ThreadsLog, FileIsOpenedOnce)
+TEST(ThreadsOutput, EveryMessageIsWhole)
 {
-    for (int round = 0; round < 20; ++round)
-        EXPECT_TRUE(fake::in_child([] {
-            std::array<FILE*, kThreads> streams{};
-            on_threads([&](uint32_t i) { streams[i] = bt_cmn_log_fpget(); });
-            EXPECT_NE(streams[0], nullptr);
-            EXPECT_THAT(streams, testing::Each(streams[0]));
-        }));
+    expect_whole(6, [](uint32_t i) {
+        const auto digit = static_cast<uint8_t>(0x11 * (i + 1));
+        Bytes bytes(1008, digit), sized(1008, digit);
+        put(sized, 0, {0xEE, 0x03});
+        const At at(bytes.data());
+        EXPECT_EQ(BT_SRV_sendHciCommand(at), 0);
+        EXPECT_EQ(BT_SRV_CON_startServiceDiscovery_UUID(at, at + 8), 0);
+        EXPECT_EQ(BT_SRV_HFP_sendATCommand(at), 0);
+        EXPECT_EQ(BT_SRV_AVP_STRCTL_setDeviceFileName(494, at), 0);
+        EXPECT_EQ(BT_SRV_OPP_pushResponseReq(sized.data()), 0);
+        EXPECT_EQ(BT_SRV_MAP_getMessage(at), 0);
+    });
 }
 
-TEST_F(ThreadsLog, RecordsAreWhole)
+TEST(ThreadsOutput, EveryLogRecordIsWhole)
 {
-    constexpr uint32_t kRounds = 200;
-    const auto write = [](uint32_t i) {
+    DebugConsoleLogSts = DebugFileOutLogSts = DebugSRVOutLogSts = 1;
+    const BtLogParameters before = g_VexLogParams;
+    g_VexLogParams.enabled_zones[VEXLOG_Zone / 32] |= 1u << (VEXLOG_Zone % 32);
+    expect_whole(5 + 1 + 4, [](uint32_t i) {
         const std::string text(300, static_cast<char>('a' + i));
         _BT_CMN_logout_Console_And_File("CMN", "%s", text.c_str());
         _BT_CMN_logout_File("EDS", "%s", text.c_str());
-        BT_CMN_logdump("CMN", text.c_str(), reinterpret_cast<const uint8_t*>(text.data()), 40);
-    };
-    const auto one_by_one = outputs_of([&] {
-        for (uint32_t i = 0; i < kThreads; ++i)
-            write(i);
+        BT_CMN_logdump("CMN", text.c_str(), reinterpret_cast<const uint8_t*>(text.data()), 16);
+        BtMessage message{};
+        message.msg_header.hdr.cid = static_cast<uint16_t>(0x1001 * (i + 1));
+        message.msg_header.hdr.len = 200;
+        std::memset(message.payload, static_cast<int>(0x11 * (i + 1)), sizeof message.payload);
+        EXPECT_EQ(BT_CMN_sendMsgWrapper("f", "g", 1, 0x4001, &message), 0);
     });
-    Counts file = records_in(one_by_one.first), console = records_in(one_by_one.second);
-    EXPECT_EQ(file.size(), 3 * kThreads);
-    EXPECT_EQ(console.size(), 2 * kThreads);
-    for (Counts* counts : {&file, &console})
-        for (auto& [record, count] : *counts)
-            count *= kRounds;
-
-    bt_cmn_log_fp_reset(); // the threads find the file not open
-    const auto at_once = outputs_of([&] {
-        on_threads([&](uint32_t i) {
-            for (uint32_t round = 0; round < kRounds; ++round)
-                write(i);
-        });
-    });
-    EXPECT_EQ(records_in(at_once.first), file);
-    EXPECT_EQ(records_in(at_once.second), console);
+    g_VexLogParams = before;
+    DebugConsoleLogSts = DebugFileOutLogSts = DebugSRVOutLogSts = 0;
 }
 
-TEST_F(ThreadsLog, TraceLinesAreWhole)
+TEST(ThreadsOutput, LogFileIsOpenedOnce)
 {
-    constexpr uint32_t kRounds = 100;
-    DebugSRVOutLogSts = 1;
-    g_VexLogParams.enabled_zones[VEXLOG_Zone / 32] |= 1u << (VEXLOG_Zone % 32);
-    const auto outputs = outputs_of([] {
-        on_threads([](uint32_t i) {
-            BtMessage message{};
-            message.msg_header.hdr.cid = static_cast<uint16_t>(0x1001 * (i + 1));
-            message.msg_header.hdr.len = 200;
-            std::memset(message.payload, static_cast<int>(0x11 * (i + 1)), sizeof message.payload);
-            for (uint32_t round = 0; round < kRounds; ++round)
-                EXPECT_EQ(BT_CMN_sendMsgWrapper("f", "g", 1, 0x4001, &message), 0);
-        });
-    });
-    Counts expected, file, console, logger;
-    for (uint32_t i = 1; i <= kThreads; ++i) {
-        const std::string digit = std::to_string(i);
-        expected["BTSRV " + digit + "00" + digit + " " + std::string(256, digit[0])] = kRounds;
+    for (int round = 0; round < 20; ++round) {
+        bt_cmn_log_fp_reset();
+        std::array<FILE*, kThreads> streams{};
+        at_once([&](uint32_t i) { streams[i] = bt_cmn_log_fpget(); });
+        EXPECT_NE(streams[0], nullptr);
+        EXPECT_THAT(streams, testing::Each(streams[0]));
     }
-    const auto count = [](const std::string& text, Counts& counts) {
-        std::istringstream lines(text);
-        for (std::string line; std::getline(lines, line);)
-            ++counts[line];
-    };
-    count(outputs.first, file);
-    count(outputs.second, console);
-    for (const fake::LogRecord& record : fake::logs())
-        if (record.channel == "QvLog") count(record.text, logger);
-    EXPECT_EQ(file, expected);
-    EXPECT_EQ(console, expected);
-    EXPECT_EQ(logger, expected);
-    g_VexLogParams.enabled_zones[VEXLOG_Zone / 32] &= ~(1u << (VEXLOG_Zone % 32));
 }
 
 // ---- shared areas
 
-// Processes that have attached nothing yet.
-void in_fresh_process(const std::function<void()>& body)
+struct Area {
+    const char* name;
+    uint32_t size;
+    uint8_t fill;
+};
+
+// Runs `body` at once in a process that has attached nothing, where the area is as given; `check` looks at it then.
+void on_fresh_area(
+    const Area& area, const Body& body, const std::function<void(const uint8_t*)>& check, void (*prepare)() = [] {})
 {
     EXPECT_TRUE(fake::in_child([&] {
+        fake::reset();
         g_bt_con_share = {};
         g_bt_hfp_share = {};
-        body();
+        const uint8_t* const at = fake::area(area.name, area.size, area.fill);
+        prepare();
+        at_once(body);
+        check(at);
         EXPECT_EQ(fake::held_locks(), 0u);
         EXPECT_LE(fake::deepest_lock(), 1u);
         EXPECT_EQ(fake::stray_unlocks(), 0u);
-    }));
+    })) << area.name;
 }
 
-TEST(ThreadsAttach, ConnectionAreaIsReadyForWhoeverComesFirst)
+TEST(ThreadsAreas, ConnectionAreaIsReadyForWhoeverComesFirst)
 {
-    fake::reset();
-    uint8_t* const area = fake::area("BT_CON_SHARE_DATA_NAME", 27796, 0x5A);
-    std::memset(area, 0, 19148);
     for (const uint32_t mode : {0u, 1u}) {
-        fake::remove_file("/fs/tmpfs/btdevicelist.txt"); // what the other mode left behind
-        in_fresh_process([&] {
-            on_threads([&](uint32_t i) {
-                EXPECT_EQ(bt_con_ApiInit(mode), 0);
-                EXPECT_NE(g_bt_con_share.semaphore, 0u);
-                EXPECT_EQ(static_cast<void*>(g_bt_con_share.area), area);
-                const BtDevAddress address = {{static_cast<uint8_t>(i), 2, 3, 4, 5, 6}, {0, 0}};
-                EXPECT_EQ(bt_con_addOrderList(&address), 0);
-                uint32_t scan_mode = 0;
-                EXPECT_EQ(BT_SRV_CON_getScanMode(&scan_mode), 0);
-                EXPECT_EQ(scan_mode, 0x5A5A5A5Au);
-                int32_t position = -1, count = -1;
-                EXPECT_EQ(bt_con_SearshOrderListAddr(&address, &position), 0);
-                EXPECT_EQ(bt_con_getRegisterDeviceNum(&count), 0);
-                EXPECT_EQ(count, 0);
-            });
-            BtConOrderList list;
-            EXPECT_EQ(bt_con_getallOrderList(&list), 0);
-            EXPECT_EQ(list.num, static_cast<int32_t>(kThreads)) << "nobody's device was lost";
-        });
+        fake::write_file(kImagePath, image_of(default_data()));
+        const auto body = [mode, none = At(nullptr)](uint32_t i) {
+            const Given device(dev(std::string(1, static_cast<char>('A' + i)))),
+                name(Bytes(256, static_cast<uint8_t>(i)));
+            Bytes record(1008);
+            EXPECT_EQ(bt_con_ApiInit(mode), 0);
+            EXPECT_NE(g_bt_con_share.semaphore, 0u);
+            EXPECT_EQ(BT_SRV_CON_getRemoteDeviceInfo(device, At(record.data())), -1);
+            EXPECT_EQ(bt_con_addRegDev(device, name, none, none, none, none, none, none, 1, 2, none, 3), 0);
+            EXPECT_EQ(bt_con_addOrderList(device), 0);
+            EXPECT_EQ(bt_con_addConnectOrder(device, 0), 0);
+            EXPECT_EQ(BT_SRV_CON_getRemoteDeviceInfo(device, At(record.data())), 0);
+            EXPECT_EQ(Bytes(record.begin(), record.begin() + 256), name.bytes());
+        };
+        const auto check = [](const uint8_t* area) {
+            for (const size_t count : {size_t{kDevices}, size_t{kOrder}, size_t{kProfileOrders}})
+                EXPECT_EQ(area[count], kThreads) << "nobody's device was lost";
+            EXPECT_EQ(difference(*fake::read_file(kImagePath), image_of(area_bytes())), "");
+        };
+        on_fresh_area({kAreaName, kAreaSize, 0}, body, check);
     }
 }
 
-TEST(ThreadsAttach, HandsFreeAreaIsReadyForWhoeverComesFirst)
+TEST(ThreadsAreas, HandsFreeAreaIsReadyForWhoeverComesFirst)
 {
-    fake::reset();
-    fake::area("BT_HFP_SHARE_DATA_NAME", 1084, 0x5A);
-    in_fresh_process([] {
-        on_threads([](uint32_t i) {
-            uint32_t level = 0;
-            BtHfpCallList calls{};
-            EXPECT_EQ(BT_SRV_HFP_getSignalLevel(&level), 0);
-            EXPECT_TRUE(level == 0x5A5A5A5A || level == 6) << level;
-            EXPECT_EQ(i == 0 ? bt_hfp_InitShareMemData() : 0, 0);
-            EXPECT_EQ(BT_SRV_HFP_getCallList(&calls), 0);
-            const auto* const bytes = reinterpret_cast<const uint8_t*>(&calls);
-            EXPECT_EQ(Bytes(bytes, bytes + sizeof calls), Bytes(sizeof calls, bytes[0])) << "all old or all new";
-        });
-    });
+    const auto body = [](uint32_t i) {
+        uint32_t level = 0;
+        BtHfpCallList calls{};
+        EXPECT_EQ(BT_SRV_HFP_getSignalLevel(&level), 0);
+        EXPECT_TRUE(level == 0x5A5A5A5A || level == 6) << level;
+        EXPECT_EQ(i == 0 ? bt_hfp_InitShareMemData() : 0, 0);
+        EXPECT_EQ(BT_SRV_HFP_getCallList(&calls), 0);
+        const auto* const bytes = reinterpret_cast<const uint8_t*>(&calls);
+        EXPECT_EQ(Bytes(bytes, bytes + sizeof calls), Bytes(sizeof calls, bytes[0])) << "all old or all new";
+    };
+    on_fresh_area({"BT_HFP_SHARE_DATA_NAME", 1084, 0x5A}, body, [](const uint8_t*) {});
 }
 
-TEST(ThreadsAttach, ListenersGetHandlesOfTheirOwn)
+TEST(ThreadsAreas, ListenersGetHandlesOfTheirOwn)
 {
-    fake::reset();
-    fake::area("/tmp/shm_eds_regist_table", 8004);
-    in_fresh_process([] {
-        BT_EDS_initialize(); // as the distributor does before any listener registers
-        std::array<std::array<uint32_t, 6>, kThreads> handles{};
-        on_threads([&](uint32_t i) {
-            const uint32_t id = 0xA881 + i;
-            for (uint32_t& handle : handles[i])
-                handle = BT_SRV_EvtSrv_regist(0x4000 + i, i, 1, &id);
-            BT_SRV_EvtSrv_suspend(handles[i][0]);
-            BT_SRV_EvtSrv_resume(handles[i][0]);
-            BtMessage event{};
-            BT_EDS_dispatch(0, &event);
-        });
-        std::set<uint32_t> distinct;
+    const auto body = [](uint32_t i) {
+        const uint32_t id = 0xA881 + i;
+        uint32_t handle = 0;
+        for (int listener = 0; listener < 6; ++listener)
+            handle = BT_SRV_EvtSrv_regist(0x4000 + i, i, 1, &id);
+        BT_SRV_EvtSrv_suspend(handle);
+        BT_SRV_EvtSrv_resume(handle);
+        const BtMessage event{};
+        BT_EDS_dispatch(0, &event);
+    };
+    const auto check = [](const uint8_t*) {
+        std::map<uint32_t, int> listeners;
+        for (uint32_t handle = 1; handle <= 6 * kThreads; ++handle) {
+            const BtEvtListener* const listener = find_HdlList(handle);
+            ASSERT_NE(listener, nullptr) << handle;
+            EXPECT_EQ(listener->event_ids[0], 0xA881 + listener->tag);
+            ++listeners[listener->tag];
+        }
         for (uint32_t i = 0; i < kThreads; ++i)
-            for (const uint32_t handle : handles[i]) {
-                distinct.insert(handle);
-                const BtEvtListener* const listener = find_HdlList(handle);
-                ASSERT_NE(listener, nullptr) << handle;
-                EXPECT_EQ(listener->pno, 0x4000 + i);
-                EXPECT_EQ(listener->event_ids[0], 0xA881 + i);
-            }
-        EXPECT_EQ(distinct.size(), 6 * kThreads);
-        EXPECT_EQ(*distinct.rbegin(), 6 * kThreads);
-    });
+            EXPECT_EQ(listeners[i], 6);
+    };
+    on_fresh_area({"/tmp/shm_eds_regist_table", 8004, 0}, body, check, BT_EDS_initialize); // as the distributor does
 }
 
 TEST(ThreadsAreas, WrittenAreasHoldTheDataOfOneThread)
 {
-    fake::reset();
-    const uint8_t* const block = fake::area("/tmp/shm_map_serviceapi", 900);
-    const uint8_t* const push = fake::area("/tmp/shm_map_pushmsg", 9652);
-    on_threads([](uint32_t i) {
-        const Bytes body(1500, static_cast<uint8_t>(i));
-        push_record record;
-        std::memset(&record, static_cast<int>(i), sizeof record);
-        record.body = body.data();
-        record.body_length = 1500;
-        message_filter filter;
-        std::memset(&filter, static_cast<int>(i), sizeof filter);
-        filter.folder_length = 256;
-        for (int round = 0; round < 20; ++round) {
-            EXPECT_EQ(BT_SRV_MAP_getMessageNum(i, filter), 0);
-            EXPECT_EQ(BT_SRV_MAP_setPushMessageData(record), 0);
-        }
-    });
-    const uint8_t writer = block[4], pusher = push[0];
-    EXPECT_EQ(Bytes(block + 9, block + 266), Bytes(257, writer));
-    EXPECT_EQ(block[0] + 256u * block[1], 43u + 256 + 2 * writer);
-    EXPECT_EQ(Bytes(push, push + 2628), Bytes(2628, pusher));
-    EXPECT_EQ(Bytes(push + 8152, push + 9652), Bytes(1500, pusher));
+    on_fresh_area(
+        {"/tmp/shm_map_serviceapi", 900, 0},
+        [](uint32_t i) {
+            message_filter filter;
+            std::memset(&filter, static_cast<int>(i), sizeof filter);
+            filter.folder_length = 256;
+            for (int round = 0; round < 20; ++round)
+                EXPECT_EQ(BT_SRV_MAP_getMessageNum(i, filter), 0);
+        },
+        [](const uint8_t* block) {
+            EXPECT_EQ(Bytes(block + 9, block + 266), Bytes(257, block[4]));
+            EXPECT_EQ(block[0] + 256u * block[1], 43u + 256 + 2 * block[4]);
+        });
+    on_fresh_area(
+        {"/tmp/shm_map_pushmsg", 9652, 0},
+        [](uint32_t i) {
+            const Bytes body(1500, static_cast<uint8_t>(i));
+            push_record record;
+            std::memset(&record, static_cast<int>(i), sizeof record);
+            record.body = body.data();
+            record.body_length = 1500;
+            for (int round = 0; round < 20; ++round)
+                EXPECT_EQ(BT_SRV_MAP_setPushMessageData(record), 0);
+        },
+        [](const uint8_t* push) {
+            EXPECT_EQ(Bytes(push, push + 2628), Bytes(2628, push[0]));
+            EXPECT_EQ(Bytes(push + 8152, push + 9652), Bytes(1500, push[0]));
+        });
 }
 
 } // namespace

@@ -1,7 +1,6 @@
 #include "store_support.h"
 
 #include <algorithm>
-#include <climits>
 #include <cstring>
 
 namespace store {
@@ -11,6 +10,11 @@ Bytes words(std::initializer_list<uint32_t> values)
     Bytes bytes(4 * values.size());
     std::memcpy(bytes.data(), values.begin(), bytes.size());
     return bytes;
+}
+
+Bytes word(uint32_t value)
+{
+    return words({value}) + Bytes(4, 0xA5);
 }
 
 Bytes operator+(Bytes left, const Bytes& right)
@@ -96,12 +100,11 @@ Bytes id_entry(char letter, uint32_t key, uint8_t value, uint32_t key2, uint8_t 
     return dev(std::string(1, letter)).bytes() + words({key}) + Bytes(8, value) + words({key2}) + Bytes(8, value2);
 }
 
-Bytes id_list(const Bytes& entries)
+Bytes id_list(Bytes entries)
 {
-    Bytes list = entries;
-    while (list.size() < 544)
-        list = list + fake::hex("FF*6 00*26");
-    return list;
+    while (entries.size() < 544)
+        entries = entries + fake::hex("FF*6 00*26");
+    return entries;
 }
 
 Bytes device_info(char letter, uint8_t fill)
@@ -117,6 +120,11 @@ Bytes search_list(const Bytes& infos)
     while (list.size() < 8580)
         list = list + fake::hex("00*256 FF*6 00*6");
     return list;
+}
+
+Bytes sample_data()
+{
+    return device_list("PQR") + order_list("QP") + profile_orders(7, "RPQ") + id_list(id_entry('R', 9, 2));
 }
 
 const Bytes& default_data()
@@ -148,7 +156,7 @@ const Bytes& stale_image()
 uint8_t* fresh_process(const Bytes& data)
 {
     fake::reset();
-    set_handle(0, nullptr);
+    g_bt_con_share = {};
     uint8_t* const area = fake::area(kAreaName, kAreaSize, 0x5A);
     std::memcpy(area, data.data(), data.size());
     fake::remove_file(kImagePath); // a new file costs no flush, rewriting the old one does
@@ -169,45 +177,19 @@ Bytes area_bytes(size_t at, size_t size)
     return Bytes(from, from + size);
 }
 
-void set_handle(uint32_t semaphore, void* area)
+Row change(Operation operation, Bytes before, Bytes after, int32_t result, Locking locking)
 {
-    const At handle = bt_con_getShareMemAccessPtr();
-    std::memcpy(handle, &semaphore, sizeof semaphore);
-    std::memcpy(handle + sizeof(void*), &area, sizeof area);
+    return {std::move(operation), result, locking, std::move(before), std::move(after)};
 }
 
-uint32_t handle_semaphore()
+Row answer(Operation operation, Bytes out, int32_t result, Locking locking, Bytes out_failed)
 {
-    uint32_t semaphore = 0;
-    std::memcpy(&semaphore, At(bt_con_getShareMemAccessPtr()), sizeof semaphore);
-    return semaphore;
+    return {std::move(operation), result, locking, {}, {}, std::move(out), std::move(out_failed)};
 }
 
-uint8_t* handle_area()
+Row refused(int32_t result, Operation operation, Locking locking)
 {
-    uint8_t* area = nullptr;
-    std::memcpy(&area, At(bt_con_getShareMemAccessPtr()) + sizeof(void*), sizeof area);
-    return area;
-}
-
-Row change(const std::string& what, Bytes before, Bytes after, Call call, int32_t result, Locking locking)
-{
-    return {what, std::move(call), result, locking, std::move(before), std::move(after)};
-}
-
-Row answer(const std::string& what, Call call, Bytes out, int32_t result, Locking locking, Bytes out_failed)
-{
-    return {what, std::move(call), result, locking, {}, {}, std::move(out), std::move(out_failed)};
-}
-
-Row refused(const std::string& what, int32_t result, Call call, Locking locking)
-{
-    return {what, std::move(call), result, locking};
-}
-
-Call nulled(Call call)
-{
-    return [=](At) { return call(nullptr); };
+    return {std::move(operation), result, locking};
 }
 
 namespace {
@@ -216,8 +198,8 @@ using Spoil = std::function<void(uint8_t* area)>;
 
 class Runner {
 public:
-    Runner(const Row& row, const Field& field, bool attaches)
-        : row_(row), field_(field), attaches_(attaches), old_(default_data() + Bytes(kAreaSize - kPersistentSize, 0x5A))
+    Runner(const Field& field, const Row& row)
+        : row_(row), field_(field), old_(default_data() + Bytes(kAreaSize - kPersistentSize, 0x5A))
     {
         put(old_, field.at, row.before.empty() ? field.usual : row.before);
         new_ = old_;
@@ -227,8 +209,8 @@ public:
 
     void run()
     {
-        SCOPED_TRACE(row_.what);
-        perform({});
+        SCOPED_TRACE(row_.operation.what);
+        perform();
         EXPECT_EQ(result_, row_.result);
         EXPECT_EQ(std::count(calls_.begin(), calls_.end(), "SemLock"), row_.locking == Locking::kNone ? 0 : 1);
         EXPECT_EQ(fake::stray_unlocks(), 0u);
@@ -236,25 +218,25 @@ public:
         sweep(fake::fail_nth);
         sweep(fake::fail_from);
         hostile();
-        if (!attaches_) detached();
+        if (field_.attached) detached();
     }
 
 private:
     // One run of the operation; `spoil` comes right before it.
-    void perform(const Spoil& spoil)
+    void perform(const Spoil& spoil = [](uint8_t*) {})
     {
-        uint8_t* const area = attaches_ ? fresh_process() : attached_process();
+        uint8_t* const area = field_.attached ? attached_process() : fresh_process();
         std::copy(old_.begin(), old_.end(), area);
         const size_t size = std::max<size_t>(row_.out.size(), 8);
         uint8_t* const out = fake::guarded(static_cast<uint32_t>(size));
         const auto calls_before = static_cast<ptrdiff_t>(fake::calls().size());
-        if (spoil) spoil(area);
+        spoil(area);
 
-        result_ = row_.call(out);
+        result_ = row_.operation.call(out);
 
         EXPECT_EQ(fake::held_locks(), 0u);
         EXPECT_LE(fake::deepest_lock(), 1u);
-        area_.assign(area, area + kAreaSize);
+        area_ = area_bytes();
         out_.assign(out, out + size);
         calls_.assign(fake::calls().begin() + calls_before, fake::calls().end());
     }
@@ -286,7 +268,7 @@ private:
     void sweep(void (*fail)(uint32_t))
     {
         for (uint32_t n = 1; n < 9; ++n) {
-            perform([&](uint8_t*) { fail(n); });
+            perform([=](uint8_t*) { fail(n); });
             if (fake::counted_calls() < n) return;
             const std::string& failed = calls_[n - 1];
             SCOPED_TRACE("failing call " + std::to_string(n) + ", " + failed);
@@ -312,7 +294,7 @@ private:
                 EXPECT_TRUE(left == value || (left >= 0 && left <= capacity)) << "left as " << left;
             }
         for (const int fill : {0x00, 0x7F, 0x80, 0xFF})
-            spoiled([&](uint8_t* area) { std::memset(area, fill, kAreaSize); });
+            spoiled([=](uint8_t* area) { std::memset(area, fill, kAreaSize); });
     }
 
     void spoiled(const Spoil& spoil)
@@ -320,7 +302,7 @@ private:
         Bytes before;
         perform([&](uint8_t* area) {
             spoil(area);
-            before.assign(area, area + kAreaSize);
+            before = area_bytes();
         });
         EXPECT_EQ(fake::stray_unlocks(), 0u);
         std::memcpy(before.data() + field_.at, area_.data() + field_.at, field_.owned);
@@ -330,19 +312,19 @@ private:
     // Without a semaphore an operation runs unguarded, without the area it fails.
     void detached()
     {
-        perform([](uint8_t* area) { set_handle(0, area); });
+        perform([](uint8_t*) { g_bt_con_share.semaphore = 0; });
         EXPECT_EQ(result_, row_.result);
         EXPECT_TRUE(calls_.empty());
         expect_new(writes_image_);
         if (row_.result != 0) return;
-        perform([](uint8_t*) { set_handle(handle_semaphore(), nullptr); });
+        perform([](uint8_t*) { g_bt_con_share.area = nullptr; });
         EXPECT_EQ(result_, -1);
         expect_old();
     }
 
     const Row& row_;
     const Field& field_;
-    bool attaches_, writes_image_;
+    bool writes_image_;
     int32_t result_ = 0;
     Bytes old_, new_, area_, out_;
     std::vector<std::string> calls_;
@@ -350,16 +332,10 @@ private:
 
 } // namespace
 
-void run_rows(const std::vector<Row>& rows, const Field& field)
+void run_rows(const Field& field, const std::vector<Row>& rows)
 {
     for (const Row& row : rows)
-        Runner(row, field, false).run();
-}
-
-void run_query_rows(const std::vector<Row>& rows, const Field& field)
-{
-    for (const Row& row : rows)
-        Runner(row, field, true).run();
+        Runner(field, row).run();
 }
 
 } // namespace store
