@@ -188,13 +188,12 @@ const std::string& root()
     return folder;
 }
 
-std::string write_file(const std::string& unit_path, const Bytes& content)
+void write_file(const std::string& unit_path, const Bytes& content)
 {
-    const std::string path = root() + unit_path;
-    std::filesystem::create_directories(std::filesystem::path(path).parent_path());
-    std::ofstream file(path, std::ios::binary | std::ios::trunc);
-    file.write(reinterpret_cast<const char*>(content.data()), static_cast<std::streamsize>(content.size()));
-    return path;
+    const std::filesystem::path path = root() + unit_path;
+    std::filesystem::create_directories(path.parent_path());
+    std::ofstream(path, std::ios::binary)
+        .write(reinterpret_cast<const char*>(content.data()), static_cast<std::streamsize>(content.size()));
 }
 
 std::optional<Bytes> read_file(const std::string& unit_path)

@@ -18,9 +18,7 @@ struct Post {
     uint32_t zero;
     Bytes message; // as many bytes as the call stated
 
-    uint16_t cid() const { return word(8); }
-    uint16_t length() const { return word(10); }
-    uint16_t word(size_t at) const { return static_cast<uint16_t>(message.at(at) | message.at(at + 1) << 8); }
+    uint16_t length() const { return static_cast<uint16_t>(message.at(10) | message.at(11) << 8); }
     Bytes payload() const { return Bytes(message.begin() + 16, message.end()); }
 };
 
@@ -85,7 +83,7 @@ bool in_child(const std::function<void()>& body);
 
 // Root below which the library opens its files (BT_SERVICE_ROOT of the test program), a folder of this process alone.
 const std::string& root();
-std::string write_file(const std::string& unit_path, const Bytes& content); // creates folders; returns the real path
+void write_file(const std::string& unit_path, const Bytes& content); // creates folders
 std::optional<Bytes> read_file(const std::string& unit_path);
 void remove_file(const std::string& unit_path);
 

@@ -225,19 +225,6 @@ TEST_F(Log, TimePrintWritesTheTimeOfDay)
     EXPECT_TRUE(std::regex_match(text, std::regex(R"(\d\d:\d\d:\d\d\.\d{3} )"))) << text;
 }
 
-TEST_F(Log, OnlyTheStreamProcessNeedsItsSwitchForTheTrace)
-{
-    const struct {
-        uint32_t pno;
-        int32_t stream, expected;
-    } rows[] = {{0x08C2, 0, 1}, {0x08C5, 0, 0}, {0x08C5, 1, 1}};
-    for (const auto& row : rows) {
-        fake::set_pno(row.pno);
-        DebugStrmLogStsOn = row.stream;
-        EXPECT_EQ(BT_CMN_DebugLogThreadIdFilter(nullptr), row.expected) << row.pno << " " << row.stream;
-    }
-}
-
 TEST_F(Log, DumpShowsSixteenBytesALine)
 {
     const std::string full = "  4142 4344 4546 4748 494a 4b4c 4d4e 4f50   ABCDEFGH IJKLMNOP \n";

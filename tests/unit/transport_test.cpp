@@ -36,6 +36,7 @@ protected:
     {
         fake::reset();
         DebugConsoleLogSts = DebugFileOutLogSts = DebugSRVOutLogSts = 0;
+        DebugStrmLogStsOn = 0;
     }
     void TearDown() override { SetUp(); }
 
@@ -139,8 +140,11 @@ TEST_F(Transport, TraceShowsIdAndAtMost128Bytes)
     DebugSRVOutLogSts = 0;
     EXPECT_EQ(traced(1, 1), "");
     DebugSRVOutLogSts = 1;
-    fake::set_pno(0x08C5);
+    fake::set_pno(0x08C5); // the stream process has a switch of its own
     EXPECT_EQ(traced(1, 1), "");
+    DebugStrmLogStsOn = 1;
+    EXPECT_EQ(traced(1, 0), "BTSRV 0001 \n");
+    EXPECT_EQ(BT_CMN_DebugLogThreadIdFilter(nullptr), 1);
 }
 
 TEST_F(Transport, TraceGoesToEveryOutputThatIsOn)
