@@ -1,10 +1,8 @@
 // The listener table and event dispatch.
-#include "fake_platform.h"
 #include "log_capture.h"
 
 #include <bt_service/bt_events.h>
 #include <bt_service/bt_message.h>
-#include <gtest/gtest.h>
 
 #include <algorithm>
 #include <cstring>

@@ -1,5 +1,4 @@
 // Event queue, timers, shared memory objects and byte order.
-#include "fake_platform.h"
 #include "log_capture.h"
 
 #include <bt_service/bt_byte_order.h>
@@ -9,7 +8,6 @@
 #include <bt_service/bt_timer.h>
 #include <fcntl.h>
 #include <gmock/gmock.h>
-#include <gtest/gtest.h>
 #include <sys/mman.h>
 #include <sys/stat.h>
 #include <unistd.h>
@@ -89,10 +87,7 @@ TEST_F(EventQueue, TakenEventsAreTraced)
     head_.slot[8] = 7;
     Bytes buffer(1024);
     DebugSRVOutLogSts = DebugConsoleLogSts = 1;
-    testing::internal::CaptureStdout();
-    BT_CMN_queueMsg(buffer.data(), &head_);
-    std::fflush(stdout);
-    EXPECT_EQ(testing::internal::GetCapturedStdout(), "BTSRV 0007 \n");
+    EXPECT_EQ(outputs_of([&] { BT_CMN_queueMsg(buffer.data(), &head_); }).console, "BTSRV 0007 \n");
     DebugSRVOutLogSts = DebugConsoleLogSts = 0;
 }
 

@@ -1,14 +1,14 @@
-// Collects what goes through the library's log pointer, in a form that rows of expected lines can be compared with.
+// Collects what goes through the library's log pointer and what its outputs write, for comparison with expected lines.
 #pragma once
 
+#include "fake_platform.h"
+
 #include <bt_service/bt_log.h>
+#include <gtest/gtest.h>
 
 #include <cstdarg>
 #include <cstdio>
-#include <functional>
 #include <regex>
-#include <string>
-#include <vector>
 
 using Lines = std::vector<std::string>;
 
@@ -48,4 +48,21 @@ inline std::string pointer_text(const void* pointer)
     char text[32];
     std::snprintf(text, sizeof text, "%p", pointer);
     return text;
+}
+
+inline const char* const kLogFile = "/tmp/bt_cmn.log";
+
+struct Outputs {
+    std::string console, file;
+};
+
+// What `body` writes to standard output and appends to the log file.
+inline Outputs outputs_of(const std::function<void()>& body)
+{
+    const size_t before = fake::read_file(kLogFile).value_or(fake::Bytes()).size();
+    testing::internal::CaptureStdout();
+    body();
+    std::fflush(nullptr);
+    const fake::Bytes file = fake::read_file(kLogFile).value_or(fake::Bytes());
+    return {testing::internal::GetCapturedStdout(), std::string(file.begin(), file.end()).substr(before)};
 }

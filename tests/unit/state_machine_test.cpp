@@ -4,7 +4,6 @@
 #include <bt_service/bt_message.h>
 #include <bt_service/bt_state_machine.h>
 #include <gmock/gmock.h>
-#include <gtest/gtest.h>
 
 namespace {
 

@@ -1,4 +1,5 @@
 // Many threads at once: requests, log, trace, shared areas and their first use. Also run under the thread sanitizer.
+#include "log_capture.h"
 #include "store_support.h"
 
 #include <bt_service/bt_service.h>
@@ -8,7 +9,6 @@
 #include <atomic>
 #include <cstring>
 #include <map>
-#include <set>
 #include <sstream>
 #include <thread>
 
@@ -42,9 +42,9 @@ void at_once(const Body& body)
 using Counts = std::map<std::string, uint32_t>;
 
 // A record begins with a time, which is left out, or is a line of the trace; the lines of a dump belong to theirs.
-void count_records(const std::string& output, const Bytes& text, Counts& counts)
+void count_records(const std::string& output, const std::string& text, Counts& counts)
 {
-    std::istringstream lines(std::string(text.begin(), text.end()));
+    std::istringstream lines(text);
     std::string record;
     for (std::string line; std::getline(lines, line);) {
         const bool timed = line.size() > 24 && line[4] == '/' && line[23] == ' ';
@@ -60,18 +60,15 @@ void count_records(const std::string& output, const Bytes& text, Counts& counts)
 Counts left_by(uint32_t rounds, const std::function<void(const Body&)>& run, const Body& body)
 {
     fake::reset();
-    fake::remove_file("/tmp/bt_cmn.log");
     bt_cmn_log_fp_reset(); // the threads find the file not open
-    testing::internal::CaptureStdout();
-    run([&](uint32_t i) {
+    const Body rounds_of = [&](uint32_t i) {
         for (uint32_t round = 0; round < rounds; ++round)
             body(i);
-    });
-    std::fflush(nullptr);
-    const std::string console = testing::internal::GetCapturedStdout();
+    };
+    const Outputs outputs = outputs_of([&] { run(rounds_of); });
     Counts counts;
-    count_records("console ", Bytes(console.begin(), console.end()), counts);
-    count_records("file ", fake::read_file("/tmp/bt_cmn.log").value_or(Bytes()), counts);
+    count_records("console ", outputs.console, counts);
+    count_records("file ", outputs.file, counts);
     for (const fake::LogRecord& record : fake::logs())
         ++counts[record.channel + record.text];
     for (const fake::Post& post : fake::posts())

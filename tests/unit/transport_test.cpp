@@ -1,11 +1,9 @@
 // Sending, receiving and tracing messages, and the lookups in a request-response table.
-#include "fake_platform.h"
 #include "log_capture.h"
 
 #include <bt_service/bt_message.h>
 #include <bt_service/bt_transport.h>
 #include <gmock/gmock.h>
-#include <gtest/gtest.h>
 
 #include <cstring>
 
@@ -40,15 +38,12 @@ protected:
     }
     void TearDown() override { SetUp(); }
 
-    // What sending the message writes to standard output.
-    static std::string traced(uint16_t cid, uint16_t len)
+    static Outputs sent(uint16_t cid, uint16_t len)
     {
         const BtMessage message = message_of(cid, len);
-        testing::internal::CaptureStdout();
-        BT_CMN_sendMsgWrapper("f", "g", 1, 0x4001, &message);
-        std::fflush(stdout);
-        return testing::internal::GetCapturedStdout();
+        return outputs_of([&] { BT_CMN_sendMsgWrapper("f", "g", 1, 0x4001, &message); });
     }
+    static std::string traced(uint16_t cid, uint16_t len) { return sent(cid, len).console; }
 };
 
 TEST_F(Transport, SendReportsWhatThePlatformAnswers)
@@ -114,7 +109,10 @@ TEST_F(Transport, ReceiveTakesTheOwnNumbersMessage)
                 ElementsAre("[API][START] BT_CMN_recvMsgWrapper [loop]\n", "[API]BT_CMN_recvMsgWrapper getPno=8c2\n",
                             "[API][END] BT_CMN_recvMsgWrapper (0)"));
     EXPECT_EQ(bytes_of(buffer, 1024), sent);
-    EXPECT_THAT(fake::calls(), ElementsAre("RcvMsg(2242,1024)"));
+    DebugSRVOutLogSts = DebugConsoleLogSts = 1;
+    fake::incoming(sent);
+    EXPECT_EQ(outputs_of([&] { receive(0); }).console, "BTSRV A091 00010203\n");
+    EXPECT_EQ(fake::calls()[0], "RcvMsg(2242,1024)");
     for (const int32_t answer : {0, 2, -2}) {
         fake::answer_receive(answer);
         EXPECT_THAT(
@@ -150,17 +148,19 @@ TEST_F(Transport, TraceShowsIdAndAtMost128Bytes)
 TEST_F(Transport, TraceGoesToEveryOutputThatIsOn)
 {
     DebugSRVOutLogSts = DebugFileOutLogSts = 1;
-    fake::remove_file("/tmp/bt_cmn.log");
     bt_cmn_log_fp_reset();
     VEXLOG_Zone = 45;
     const BtLogParameters before = g_VexLogParams;
     uint8_t* const mask = reinterpret_cast<uint8_t*>(&g_VexLogParams) + 12052 + 4;
     std::memset(mask, 0, 4);
-    EXPECT_EQ(traced(0xA091, 1), "");
+    EXPECT_EQ(sent(0xA091, 1).file, "BTSRV A091 00\n");
     EXPECT_TRUE(fake::logs().empty()) << "the zone is off";
     mask[1] = 1u << (13 - 8);
+    EXPECT_EQ(sent(0xA091, 2).file, "BTSRV A091 0001\n");
     EXPECT_EQ(traced(0xA091, 2), "");
-    ASSERT_EQ(fake::logs().size(), 1u);
+    DebugFileOutLogSts = 0;
+    EXPECT_EQ(sent(0xA091, 2).file, "");
+    ASSERT_EQ(fake::logs().size(), 3u);
     EXPECT_THAT(fake::logs()[0].numbers, ElementsAre(137, 45));
     EXPECT_EQ(fake::logs()[0].tag, "CMN");
     EXPECT_EQ(fake::logs()[0].text, "BTSRV A091 0001\n");
@@ -168,13 +168,9 @@ TEST_F(Transport, TraceGoesToEveryOutputThatIsOn)
         VEXLOG_Zone = zone; // no such zone: nothing is read outside the block
         EXPECT_EQ(traced(0xA091, 0), "");
     }
-    EXPECT_EQ(fake::logs().size(), 1u);
+    EXPECT_EQ(fake::logs().size(), 3u);
     VEXLOG_Zone = 13;
     g_VexLogParams = before;
-
-    std::fflush(bt_cmn_log_fpget());
-    const Bytes file = fake::read_file("/tmp/bt_cmn.log").value_or(Bytes());
-    EXPECT_EQ(std::string(file.begin(), file.end()).substr(0, 30), "BTSRV A091 00\nBTSRV A091 0001\n");
 }
 
 TEST(RequestResponseTable, LooksUpByEitherColumn)
