@@ -110,11 +110,11 @@ TEST(ThreadsOutput, EveryLogRecordIsWhole)
     DebugConsoleLogSts = DebugFileOutLogSts = DebugSRVOutLogSts = 1;
     const BtLogParameters before = g_VexLogParams;
     g_VexLogParams.enabled_zones[VEXLOG_Zone / 32] |= 1u << (VEXLOG_Zone % 32);
-    expect_whole(5 + 1 + 4, [](uint32_t i) {
+    expect_whole(11, [](uint32_t i) {
         const std::string text(300, static_cast<char>('a' + i));
         _BT_CMN_logout_Console_And_File("CMN", "%s", text.c_str());
         _BT_CMN_logout_File("EDS", "%s", text.c_str());
-        BT_CMN_logdump("CMN", text.c_str(), reinterpret_cast<const uint8_t*>(text.data()), 16);
+        BT_CMN_logdump("CMN", text.c_str(), reinterpret_cast<const uint8_t*>(text.data()), 40);
         BtMessage message{};
         message.msg_header.hdr.cid = static_cast<uint16_t>(0x1001 * (i + 1));
         message.msg_header.hdr.len = 200;
