@@ -69,7 +69,7 @@ TEST(StateChange, RunsExitsUpwardsThenEntriesDownwards)
 
 TEST(StateChange, DuplicateRowsAllRunAndTheLastParentCounts)
 {
-    const BtStateRow rows[] = {state<'1'>(kA, &kOfP), state<'2'>(kA, nullptr), state<'3'>(kB, &kOfP),
+    const BtStateRow rows[] = {state<'1'>(kA, &kOfP), state<'2'>(kA, nullptr), state<'3'>(kB, nullptr),
                                state<'4'>(kB, nullptr), kEnd};
     g_run.clear();
     g_current = kA;
