@@ -176,6 +176,8 @@ TEST(ThreadsAreas, ConnectionAreaIsReadyForWhoeverComesFirst)
             EXPECT_EQ(bt_con_addRegDev(device, name, none, none, none, none, none, none, 1, 2, none, 3), 0);
             EXPECT_EQ(bt_con_addOrderList(device), 0);
             EXPECT_EQ(bt_con_addConnectOrder(device, 0), 0);
+            for (uint8_t round = 1; round < 20; ++round) // stored under the lock, mirrored behind it
+                EXPECT_EQ(bt_con_setRegisteredDeviceDIDInfoList(Given(id_list(id_entry('A', i + 1, round))), 1), 0);
             EXPECT_EQ(BT_SRV_CON_getRemoteDeviceInfo(device, At(record.data())), 0);
             EXPECT_EQ(Bytes(record.begin(), record.begin() + 256), name.bytes());
         };
