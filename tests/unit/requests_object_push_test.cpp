@@ -6,8 +6,7 @@
 namespace {
 
 using namespace requests;
-
-constexpr Channel kObjectPush = {0x08C6, 0, 0, &kPassedThrough};
+using RequestsObjectPush = RequestRows;
 
 const struct {
     const char* name;
@@ -27,36 +26,29 @@ const struct {
     {"BT_SRV_OBEX_authenticationUseridSessionkeyWriteReq", 0x30AA, BT_SRV_OBEX_authenticationUseridSessionkeyWriteReq},
 };
 
-TEST(RequestsObjectPush, PostHeaderAndPayload)
+TEST_F(RequestsObjectPush, PostHeaderAndPayload)
 {
-    std::vector<Row> rows;
+    channel = {0x08C6, 0, 0, &kPassedThrough};
     for (const auto& request : kRecordRequests)
         for (const std::string record : {"0000", "0100 A1", "0A00 A1*9 7E", "FF00 A1*254 7E", "EE03 A1*1005 7E"})
-            rows.push_back({request.name, request.id, record, call(request.send, Given(record))});
+            posts(request.name, request.send, request.id, record, record);
     for (const std::string address : {"112233445566", "000000000000", "FFFFFFFFFFFF"})
-        rows.push_back({"BT_SRV_OPP_ConStsNotify", 0x30AB, "01" + address + "02",
-                        call(BT_SRV_OPP_ConStsNotify, 0xA501, Given(address), 0xFFFFFF02)});
-    const std::pair<int32_t, const char*> keys[] = {{0, ""}, {1, "7E"}, {16, "01 A1*14 7E"}, {20, "01 A1*18 7E"}};
-    for (const auto& [length, key] : keys)
-        rows.push_back({"BT_SRV_PBAP_setSessionKey", 0x3017, key, call(BT_SRV_PBAP_setSessionKey, Given(key), length)});
-    run_all(kObjectPush, rows);
+        POSTS(BT_SRV_OPP_ConStsNotify, 0x30AB, "01" + address + "02", 0xA501, address, 0xFFFFFF02);
+    POSTS(BT_SRV_PBAP_setSessionKey, 0x3017, "", kUnreadable, 0);
+    POSTS(BT_SRV_PBAP_setSessionKey, 0x3017, "01 A1*14 7E", "01 A1*14 7E", 16);
+    POSTS(BT_SRV_PBAP_setSessionKey, 0x3017, "01 A1*18 7E", "01 A1*18 7E", 20);
 }
 
-TEST(RequestsObjectPush, RefuseNullsAndLengths)
+TEST_F(RequestsObjectPush, RefuseNullsAndLengths)
 {
-    std::vector<Refusal> refusals = {
-        {"null address", -1, call(BT_SRV_OPP_ConStsNotify, 1, nullptr, 2)},
-        {"null key", -1, call(BT_SRV_PBAP_setSessionKey, nullptr, 16)},
-        {"null key without length", -1, call(BT_SRV_PBAP_setSessionKey, nullptr, 0)},
-    };
+    REFUSES(-1, BT_SRV_OPP_ConStsNotify, 1, nullptr, 2);
+    REFUSES(-1, BT_SRV_PBAP_setSessionKey, nullptr, 16);
+    REFUSES(-1, BT_SRV_PBAP_setSessionKey, nullptr, 0);
     for (const int32_t length : {-1, 21, 256, 0x10000, INT32_MAX, INT32_MIN})
-        refusals.push_back({"key length", -1, call(BT_SRV_PBAP_setSessionKey, kUnreadable, length)});
-    for (const auto& request : kRecordRequests) {
-        refusals.push_back({request.name, -1, call(request.send, nullptr)});
-        for (const std::string length : {"EF03", "F003", "FDFF", "FEFF", "FFFF"}) // 1007, 1008, and close to the end
-            refusals.push_back({request.name, -1, call(request.send, Given(length))});
-    }
-    refuse_all(refusals);
+        REFUSES(-1, BT_SRV_PBAP_setSessionKey, kUnreadable, length);
+    for (const auto& request : kRecordRequests) // 1007 bytes, 1008, and close to the end
+        for (const Given& record : {Given(nullptr), Given("EF03"), Given("F003"), Given("FEFF"), Given("FFFF")})
+            refuses(request.name, -1, call(request.send, record));
 }
 
 } // namespace
