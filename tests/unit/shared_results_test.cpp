@@ -150,28 +150,16 @@ void run(const List& list, const std::vector<Case>& cases)
 
 TEST_F(SharedResults, ListsOfAudioAndVideoAreCopiedAsFarAsTheyGo)
 {
+    const std::vector<Case> cases = {{5, 0, 5, 0, 5},       {5, 0, 4, 0, 4},      {5, 3, 10, 0, 2},
+                                     {5, 5, 10, 0, 0},      {5, 6, 10, 0, 0},     {5, 100, 0, 0, 0},
+                                     {0, 0, 100, 0, 0},     {100, 90, 10, 0, 10}, {100, 0, 100, 0, 100},
+                                     {100, 90, 11, -1, 0},  {100, 0, 101, -1, 0}, {100, 101, 0, -1, 0},
+                                     {101, 0, 100, 0, 100}, {101, 100, 0, 0, 0},  {~0u, 99, 1, 0, 1},
+                                     {5, 1, ~0u, -1, 0},    {5, ~0u, 1, -1, 0},   {5, 1u << 31, 1u << 31, -1, 0}};
     for (const List& list : kAudioVideoLists) {
-        run(list, {{5, 0, 5, 0, 5},
-                   {5, 0, 4, 0, 4},
-                   {5, 3, 10, 0, 2},
-                   {5, 5, 10, 0, 0},
-                   {5, 6, 10, 0, 0},
-                   {5, 100, 0, 0, 0},
-                   {0, 0, 100, 0, 0},
-                   {100, 90, 10, 0, 10},
-                   {100, 0, 100, 0, 100},
-                   {100, 90, 11, -1, 0},
-                   {100, 0, 101, -1, 0},
-                   {100, 101, 0, -1, 0}});
-        // Sums that would wrap around, and impossible numbers, which count as 100.
-        run(list, {{5, 1, 0xFFFFFFFF, -1, 0},
-                   {5, 0xFFFFFFFF, 1, -1, 0},
-                   {5, 0x80000000, 0x80000000, -1, 0},
-                   {101, 0, 100, 0, 100},
-                   {101, 100, 0, 0, 0},
-                   {0xFFFFFFFF, 99, 1, 0, 1}});
+        run(list, cases);
         for (const uint32_t more : {0u, 2 * list.entry_size, 3 * list.entry_size - 1}) // areas that end early
-            run(list, {{0xFFFFFFFF, 0, 100, 0, more == 0 ? 0u : 2u, 12 + more}});
+            run(list, {{~0u, 0, 100, 0, more == 0 ? 0u : 2u, 12 + more}});
         const auto read = [&](uint8_t* out) { return list.read(0, 10, out); };
         expect_untouched_without_area(list.area, list.size, 0, 12, 0, read);
     }
@@ -191,19 +179,12 @@ TEST_F(SharedResults, ListsOfAudioAndVideoAreCopiedAsFarAsTheyGo)
 TEST_F(SharedResults, ListsOfMessageAccessAreCopiedAsFarAsTheyGo)
 {
     for (const List& list : kMessageAccessLists) {
-        const uint32_t full = list.entry_size == 1648 ? 150 : 100, huge = 0xFFFFFFFF;
-        run(list, {{0, 0, kAll, 0, 0},
-                   {3, 0, kAll, 0, 3},
-                   {full, 0, kAll, 0, full},
-                   {full + 1, 0, kAll, 0, full},
-                   {huge, 0, kAll, 0, full},
-                   {0, 0, 10, 0, 0},
-                   {3, 0, 10, 0, 3},
-                   {full, 0, 10, 0, 10},
-                   {full + 1, 0, full + 1, 0, full},
-                   {huge, 0, huge, 0, full},
-                   {huge, 0, 1, 0, 1},
-                   {3, 0, 0, -1, 0}});
+        const uint32_t full = list.entry_size == 1648 ? 150 : 100, more = full + 1;
+        const std::vector<Case> cases = {{0, 0, kAll, 0, 0},       {3, 0, kAll, 0, 3},      {full, 0, kAll, 0, full},
+                                         {more, 0, kAll, 0, full}, {~0u, 0, kAll, 0, full}, {0, 0, 10, 0, 0},
+                                         {3, 0, 10, 0, 3},         {full, 0, 10, 0, 10},    {more, 0, more, 0, full},
+                                         {~0u, 0, ~0u, 0, full},   {~0u, 0, 1, 0, 1},       {3, 0, 0, -1, 0}};
+        run(list, cases);
         for (const uint32_t maximum : {kAll, 1u})
             expect_untouched_without_area(list.area, list.size, list.size, list.entries_at, -1,
                                           [&](uint8_t* out) { return list.read(0, maximum, out); });
@@ -216,24 +197,19 @@ TEST_F(SharedResults, ListsOfMessageAccessAreCopiedAsFarAsTheyGo)
 
 TEST_F(SharedResults, MessageIsCopiedWithItsBody)
 {
-    const uint32_t usual = 73713, huge = 0xFFFFFFFF;
-    run(kMessage, {{0, 0, kAll, 0, 0},
-                   {500, 0, kAll, 0, 500},
-                   {65541, 0, kAll, 0, 65541},
-                   {65542, 0, kAll, 0, 65541},
-                   {huge, 0, kAll, 0, 65541},
-                   {500, 0, 100, 0, 100},
-                   {100, 0, 500, 0, 100},
-                   {0, 0, 1, 0, 0},
-                   {65542, 0, 65542, 0, 65541},
-                   {huge, 0, huge, 0, 65541},
-                   {1, 0, 0, -1, 0}});
+    const uint32_t usual = 73713;
+    const std::vector<Case> cases = {{0, 0, kAll, 0, 0},         {500, 0, kAll, 0, 500},   {65541, 0, kAll, 0, 65541},
+                                     {65542, 0, kAll, 0, 65541}, {~0u, 0, kAll, 0, 65541}, {500, 0, 100, 0, 100},
+                                     {100, 0, 500, 0, 100},      {0, 0, 1, 0, 0},          {65542, 0, 65542, 0, 65541},
+                                     {~0u, 0, ~0u, 0, 65541},    {1, 0, 0, -1, 0}};
+    run(kMessage, cases);
     // A larger area; one without a size, for which the size it asked for counts; those reported smaller than asked.
-    run(kMessage, {{huge, 0, kAll, 0, 71828, 80000},
-                   {70000, 0, 71000, 0, 70000, 80000},
-                   {huge, 0, kAll, 0, 65541, usual, 0},
-                   {500, 0, kAll, 0, 1, usual, 8173},
-                   {500, 0, 500, 0, 0, usual, 8172}});
+    const std::vector<Case> sizes = {{~0u, 0, kAll, 0, 71828, 80000, kAll},
+                                     {70000, 0, 71000, 0, 70000, 80000, kAll},
+                                     {~0u, 0, kAll, 0, 65541, usual, 0},
+                                     {500, 0, kAll, 0, 1, usual, 8173},
+                                     {500, 0, 500, 0, 0, usual, 8172}};
+    run(kMessage, sizes);
     for (const uint32_t maximum : {kAll, 5u})
         expect_untouched_without_area(kMessage.area, usual, usual, 8172, -1,
                                       [=](uint8_t* out) { return read_message(0, maximum, out); });
