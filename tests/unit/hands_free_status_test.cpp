@@ -15,34 +15,32 @@ const std::string kLink = "LinkShareData(BT_HFP_SHARE_DATA_NAME)", kCreate = "Cr
 const std::string kLock = "SemLock", kUnlock = "SemUnlock";
 
 struct Query {
-    const char* name;
     uint32_t offset, size;
     std::function<int32_t(void*)> call;
 };
 
 template <class Output>
-std::function<int32_t(void*)> query(int32_t (*function)(Output*))
+Query query(uint32_t offset, int32_t (*function)(Output*))
 {
-    return [=](void* out) { return function(static_cast<Output*>(out)); };
+    return {offset, sizeof(Output), [=](void* out) { return function(static_cast<Output*>(out)); }};
 }
 
-std::function<int32_t(void*)> call_info(uint32_t index)
+Query call_info(uint32_t index, uint32_t offset = 0)
 {
-    return [=](void* out) { return BT_SRV_HFP_getCallInfo(index, static_cast<BtHfpCall*>(out)); };
+    return {offset, 100, [=](void* out) { return BT_SRV_HFP_getCallInfo(index, static_cast<BtHfpCall*>(out)); }};
 }
 
-const Query kQueries[] = {
-    {"signal level", 0, 4, query(BT_SRV_HFP_getSignalLevel)},
-    {"service area", 4, 4, query(BT_SRV_HFP_getServiceAreaStatus)},
-    {"roaming", 8, 4, query(BT_SRV_HFP_getRoamingStatus)},
-    {"audio link", 12, 4, query(BT_SRV_HFP_getAudioLinkStatus)},
-    {"AG functions", 16, 36, query(BT_SRV_HFP_getAGSupportFunction)},
-    {"in-band ring tone", 32, 4, query(BT_SRV_HFP_getSupportInbandRingTone)},
-    {"three-way call", 52, 28, query(BT_SRV_HFP_getSupportThreewayCall)},
-    {"call list", 80, 1004, query(BT_SRV_HFP_getCallList)},
-    {"call 0", 84, 100, call_info(0)},
-    {"call 9", 984, 100, call_info(9)},
-};
+const Query kQueries[] = {query(0, BT_SRV_HFP_getSignalLevel),
+                          query(4, BT_SRV_HFP_getServiceAreaStatus),
+                          query(8, BT_SRV_HFP_getRoamingStatus),
+                          query(12, BT_SRV_HFP_getAudioLinkStatus),
+                          query(16, BT_SRV_HFP_getAGSupportFunction),
+                          query(32, BT_SRV_HFP_getSupportInbandRingTone),
+                          query(52, BT_SRV_HFP_getSupportThreewayCall),
+                          query(80, BT_SRV_HFP_getCallList),
+                          call_info(0, 84),
+                          call_info(9, 984)};
+static_assert(sizeof(BtHfpAgFunctions) == 36 && sizeof(BtHfpThreewayCall) == 28 && sizeof(BtHfpCallList) == 1004);
 
 // Every test starts as a process that has attached nothing.
 class HandsFreeStatus : public testing::Test {
@@ -51,27 +49,24 @@ protected:
     {
         fake::reset();
         g_bt_hfp_share = {};
+        area = fake::area(kArea, 1084); // no two neighbouring words are equal; it ends where its last byte does
+        for (size_t i = 0; i < 1084; ++i)
+            area[i] = static_cast<uint8_t>(i * 7 + i / 256);
     }
     void TearDown() override { g_bt_hfp_share = {}; }
 
-    // An area of which no two neighbouring words are equal; it ends where its last byte does.
-    static uint8_t* patterned_area()
-    {
-        uint8_t* const area = fake::area(kArea, 1084);
-        for (size_t i = 0; i < 1084; ++i)
-            area[i] = static_cast<uint8_t>(i * 7 + i / 256);
-        return area;
-    }
+    uint8_t* area = nullptr;
 };
 
 TEST_F(HandsFreeStatus, HandleGrowsStepByStepAndStays)
 {
     EXPECT_EQ(bt_hfp_getShareMemAccessPtr(), &g_bt_hfp_share);
-    fake::fail_only("CreateSemaphore");
+    fake::fail_from(1);
     EXPECT_EQ(bt_hfp_ShareMemAccessInit(), -1) << "nothing there";
     EXPECT_EQ(bt_hfp_SemLock(), -1);
     EXPECT_EQ(bt_hfp_SemUnlock(), -1);
-    uint8_t* const area = patterned_area();
+    fake::fail_from(0);
+    fake::fail_only("CreateSemaphore");
     EXPECT_EQ(bt_hfp_ShareMemAccessInit(), -1) << "no lock yet";
     EXPECT_EQ(g_bt_hfp_share.area, area);
     EXPECT_EQ(bt_hfp_SemLock(), -1);
@@ -111,10 +106,9 @@ TEST_F(HandsFreeStatus, QueriesCopyTheirFieldOnceAreaAndLockAreThere)
                 {"CreateSemaphore", false, {kLink, kCreate}, {kCreate, kLock, kUnlock}}};
     for (const Query& query : kQueries)
         for (const auto& row : rows) {
-            SCOPED_TRACE(query.name + (" " + row.failing));
+            SCOPED_TRACE(testing::Message() << query.offset << " " << row.failing);
             SetUp();
-            const uint8_t* const at = patterned_area() + query.offset;
-            const Bytes field(at, at + query.size);
+            const Bytes field(area + query.offset, area + query.offset + query.size);
             fake::fail_only(row.failing.c_str());
             EXPECT_EQ(output_of(query.size, query.call, row.copied ? 0 : -1), row.copied ? field : Bytes());
             fake::fail_only("");
@@ -130,12 +124,11 @@ TEST_F(HandsFreeStatus, QueriesCopyTheirFieldOnceAreaAndLockAreThere)
 
 TEST_F(HandsFreeStatus, NullOutputsAndCallsThatAreNoneTouchNothing)
 {
-    patterned_area();
     for (const Query& row : kQueries)
-        EXPECT_EQ(row.call(nullptr), -1) << row.name;
+        EXPECT_EQ(row.call(nullptr), -1) << row.offset;
     for (const uint32_t index : {10u, 256u, 42949673u, 0x80000000u, UINT32_MAX}) { // 42949673 * 100 is 4 in 32 bits
-        EXPECT_EQ(output_of(100, call_info(index), -1), Bytes()) << index;
-        EXPECT_EQ(call_info(index)(nullptr), -1) << index;
+        EXPECT_EQ(output_of(100, call_info(index).call, -1), Bytes()) << index;
+        EXPECT_EQ(call_info(index).call(nullptr), -1) << index;
     }
     EXPECT_THAT(fake::calls(), ElementsAre());
 }
@@ -153,7 +146,7 @@ TEST_F(HandsFreeStatus, InitialValuesCoverTheAreaAndNothingElse)
                 {"CreateSemaphore", -1, "CC*1100"}};
     for (const auto& row : rows) {
         SetUp();
-        const uint8_t* const area = fake::area(kArea, 1100, 0xCC);
+        area = fake::area(kArea, 1100, 0xCC);
         fake::fail_only(row.failing);
         EXPECT_EQ(requests::without_heap(bt_hfp_InitShareMemData), row.result) << row.failing;
         EXPECT_EQ(Bytes(area, area + 1100), fake::hex(row.area)) << row.failing;

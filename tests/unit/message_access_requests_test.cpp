@@ -4,7 +4,6 @@
 #include "api/message_access_post.h"
 
 #include <bt_service/bt_message_access.h>
-#include <gmock/gmock.h>
 
 namespace {
 
@@ -85,84 +84,75 @@ std::string characters(const std::string& text)
 }
 
 const std::string kBegin = characters("19000101T000000Z"), kEnd = characters("20991231T235959Z");
-const std::string kNoDate = "00*16 ";
+const std::string kDays = characters("20260102T030405Z20271231T235958Z");
 
-struct Filter {
-    std::string folder = "00000000", recipient = "00", originator = "00"; // lengths
-    std::string begin = kNoDate, end = kNoDate;
-};
+// A filter in memory, of which some lengths and the period are given.
+std::string filter(const char* folder, const char* period, const char* recipient, const char* originator)
+{
+    const std::string begin = folder + (" 66*256 1F " + std::string(period)) + " EE*3 11FFFFFF ";
+    return begin + recipient + " 72*256 " + originator + " 6F*256 EE*2 22FFFFFF";
+}
 
-// One of both requests in an area that may be too small or be reported so; the area's bytes afterwards.
-std::string area_after(bool list, const Filter& filter, uint32_t size, uint32_t reported, int32_t result)
+// Calls one of both in an area that may be too small or be reported so; the area's bytes afterwards.
+std::string area_after(bool list, const std::string& filter, uint32_t size, uint32_t reported, int32_t result)
 {
     fake::reset();
     uint8_t* const area = fake::area(kRequestArea, size, 0xDD);
     fake::report_size(kRequestArea, reported);
+    const auto bytes = [=] { return fake::to_hex(fake::Bytes(area, area + size)); };
     std::string at_post;
-    fake::at_send([&] { at_post = fake::to_hex(fake::Bytes(area, area + size)); });
-    const std::string record = filter.folder + " 66*256 1F " + filter.begin + filter.end + "EE*3 11FFFFFF " +
-                               filter.recipient + " 72*256 " + filter.originator + " 6F*256 EE*2 22FFFFFF";
-    const Call request = list ? call(BT_SRV_MAP_getMessageList, 0xFFFFFFAB, "04030201 080706F5 " + record + " 0D0C0B0A")
-                              : call(BT_SRV_MAP_getMessageNum, 0xFFFFFFAB, record);
-    EXPECT_EQ(request(), result);
-    EXPECT_THAT(fake::sizes_asked(), testing::ElementsAre(0u));
-    const std::string after = fake::to_hex(fake::Bytes(area, area + size));
-    EXPECT_EQ(at_post, result == 0 ? after : "") << "the notice comes when the block is complete";
-    return after;
+    fake::at_send([&] { at_post = bytes(); });
+    EXPECT_EQ(list ? call(BT_SRV_MAP_getMessageList, ~0x54u, "04030201 080706F5 " + filter + " 0D0C0B0A")()
+                   : call(BT_SRV_MAP_getMessageNum, ~0x54u, filter)(),
+              result);
+    EXPECT_EQ(fake::sizes_asked(), std::vector<uint32_t>{0});
+    EXPECT_EQ(at_post, result == 0 ? bytes() : "") << "the notice comes when the block is complete";
+    return bytes();
 }
 
 TEST(MessageAccessListing, BlocksHoldTheParametersInOrder)
 {
-    const std::string days = characters("20260102T030405Z20271231T235958Z");
     const struct {
-        Filter filter;
-        std::string count, list; // lengths of the blocks
-        std::string middle;
+        std::string filter, count_length, list_length, sent;
     } rows[] = {
-        {{}, "2B00", "3700", "00000000 1F " + kBegin + kEnd + "11 00 00"},
-        {{"03000000", "02", "01"}, "3100", "3D00", "00000003 66*3 1F " + kBegin + kEnd + "11 02 72*2 01 6F"},
-        {{"00010000", "FF", "FF", characters("20260102T030405Z"), characters("20271231T235958Z")},
-         "2903",
-         "3503",
-         "00000100 66*256 1F " + days + "11 FF 72*255 FF 6F*255"},
-        {{"01010000", "00", "01", "00*15 5A ", kNoDate},
-         "2C01",
-         "3801",
+        {filter("00000000", "00*32", "00", "00"), "2B00", "3700", "00000000 1F " + kBegin + kEnd + "11 00 00"},
+        {filter("03000000", "00*32", "02", "01"), "3100", "3D00",
+         "00000003 66*3 1F " + kBegin + kEnd + "11 02 72*2 01 6F"},
+        {filter("00010000", kDays.c_str(), "FF", "FF"), "2903", "3503",
+         "00000100 66*256 1F " + kDays + "11 FF 72*255 FF 6F*255"},
+        {filter("01010000", "00*15 5A 00*16", "00", "01"), "2C01", "3801",
          "00000100 66*256 1F 00*15 5A " + kEnd + "11 00 01 6F"},
-        {{"FFFFFFFF", "01", "00", kNoDate, "01 00*15 "},
-         "2C01",
-         "3801",
+        {filter("FFFFFFFF", "00*16 01 00*15", "01", "00"), "2C01", "3801",
          "00000100 66*256 1F " + kBegin + "01 00*15 11 01 72 00"},
     };
-    const auto padded = [](const std::string& block) {
-        fake::Bytes bytes = fake::hex(block);
-        bytes.resize(900, 0);
-        return fake::to_hex(bytes);
-    };
-    for (const auto& row : rows) {
-        EXPECT_EQ(area_after(false, row.filter, 900, 900, 0), padded(row.count + "0000 AB " + row.middle + " 22 00"));
-        EXPECT_EQ(area_after(true, row.filter, 900, 900, 0),
-                  padded(row.list + "0000 AB 01020304 F5060708 " + row.middle + " 22 0D0C0B0A 00"));
-    }
+    for (const auto& row : rows)
+        for (const bool list : {false, true}) {
+            fake::Bytes expected =
+                list ? fake::hex(row.list_length + "0000 AB 01020304 F5060708 " + row.sent + " 22 0D0C0B0A 00")
+                     : fake::hex(row.count_length + "0000 AB " + row.sent + " 22 00");
+            expected.resize(900, 0);
+            EXPECT_EQ(area_after(list, row.filter, 900, 900, 0), fake::to_hex(expected));
+        }
 }
 
 TEST(MessageAccessListing, OnlyTheReportedAreaIsWritten)
 {
+    const std::string nothing = filter("00000000", "00*32", "00", "00");
     const fake::Bytes block = fake::hex("2B000000 AB 00000000 1F " + kBegin + kEnd + "11 00 00 22 00");
     const struct {
         uint32_t size, reported;
         int32_t result;
         uint32_t written; // of the block with its length, then zeros
-    } rows[] = {{3, 3, -1, 0},   {4, 4, 0, 4},          {5, 5, 0, 5},   {46, 46, 0, 46}, {47, 47, 0, 47},
-                {60, 47, 0, 47}, {4096, 4096, 0, 4096}, {47, 0, 0, 47}, {60, 0, 0, 47},  {60, 3, -1, 0}};
+    } rows[] = {{3, 3, -1, 0},   {4, 4, 0, 4},          {46, 46, 0, 46}, {47, 47, 0, 47},
+                {60, 47, 0, 47}, {4096, 4096, 0, 4096}, {60, 0, 0, 47},  {60, 3, -1, 0}};
     for (const auto& row : rows) {
-        SCOPED_TRACE(testing::Message() << row.size << " reported as " << row.reported);
         fake::Bytes expected = block;
         expected.resize(row.written, 0);
         expected.resize(row.size, 0xDD);
-        EXPECT_EQ(area_after(false, {}, row.size, row.reported, row.result), fake::to_hex(expected));
+        EXPECT_EQ(area_after(false, nothing, row.size, row.reported, row.result), fake::to_hex(expected))
+            << row.reported;
     }
-    EXPECT_EQ(area_after(true, {}, 100, 0, 0).substr(58 * 3), "00 " + fake::to_hex(fake::Bytes(41, 0xDD)))
+    EXPECT_EQ(area_after(true, nothing, 100, 0, 0).substr(58 * 3), "00 " + fake::to_hex(fake::Bytes(41, 0xDD)))
         << "the last of 4 + 55 bytes, and none more";
 }
 

@@ -15,12 +15,8 @@
 #endif
 #endif
 
-namespace {
-
-thread_local bool counting = false;
-thread_local uint32_t heap_calls = 0;
-
-} // namespace
+static thread_local bool counting = false;
+static thread_local uint32_t heap_calls = 0;
 
 uint32_t requests::heap_calls_of(const std::function<void()>& body)
 {
@@ -33,14 +29,10 @@ uint32_t requests::heap_calls_of(const std::function<void()>& body)
 
 #if defined(__GLIBC__) && !defined(BT_SANITIZER_HAS_THE_HEAP)
 
-namespace {
-
-void count()
+static void count()
 {
     if (counting && !fake::inside()) ++heap_calls;
 }
-
-} // namespace
 
 extern "C" {
 void* __libc_malloc(size_t size);

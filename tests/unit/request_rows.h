@@ -119,27 +119,13 @@ inline fake::Bytes message_of(const Channel& channel, const Row& row)
     return message;
 }
 
-inline void expect_catalogued(const Channel& channel, const Row& row)
-{
-    const bt::catalogue::Row* const entry = bt::catalogue::find_request(row.name);
-    ASSERT_NE(entry, nullptr);
-    EXPECT_EQ(entry->id, row.id);
-    EXPECT_EQ(entry->process, channel.pno);
-    const fake::Bytes payload = fake::hex(row.payload);
-    const bt::catalogue::Decoded decoded = bt::catalogue::decode_by(*entry, payload.data(), payload.size());
-    EXPECT_EQ(decoded.values.size(), entry->layout.size());
-    EXPECT_FALSE(decoded.truncated);
-    EXPECT_TRUE(decoded.extra.empty());
-}
-
 class RequestRows : public testing::Test {
 protected:
     template <class Function, class... Arguments>
     void posts(const char* name, Function function, uint16_t id, const std::string& payload, Arguments... arguments)
     {
-        const Row row = {name, id, payload, call(function, arguments...)};
         SCOPED_TRACE(std::string(name) + " " + payload.substr(0, 100));
-        posted_.insert(name);
+        const Row row = {name, id, payload, call(function, arguments...)};
         std::vector<std::string> calls = channel.platform_calls;
         calls.push_back("SndMsg");
         for (size_t i = 0; i < std::size(kPosted); ++i) {
@@ -154,7 +140,15 @@ protected:
             EXPECT_EQ(fake::posts()[0].zero, 0u);
             EXPECT_EQ(fake::to_hex(fake::posts()[0].message), fake::to_hex(message_of(channel, row)));
         }
-        expect_catalogued(channel, row);
+        posted_.insert(name);
+        const bt::catalogue::Row* const entry = bt::catalogue::find_request(name);
+        ASSERT_NE(entry, nullptr);
+        EXPECT_EQ(entry->id, id);
+        EXPECT_EQ(entry->process, channel.pno);
+        const fake::Bytes bytes = fake::hex(payload);
+        const bt::catalogue::Decoded decoded = bt::catalogue::decode_by(*entry, bytes.data(), bytes.size());
+        EXPECT_EQ(decoded.values.size(), entry->layout.size());
+        EXPECT_TRUE(!decoded.truncated && decoded.extra.empty());
     }
 
     void refuses(const char* text, int32_t result, const Call& call)
@@ -162,8 +156,9 @@ protected:
         ++refused_;
         fake::reset();
         channel.before();
-        EXPECT_EQ(call(), result) << text << ", refusal " << refused_ << " of the test";
-        EXPECT_EQ(fake::calls(), channel.platform_calls) << text << ", refusal " << refused_ << " of the test";
+        SCOPED_TRACE(testing::Message() << "refusal " << refused_ << " of the test: " << text);
+        EXPECT_EQ(call(), result);
+        EXPECT_EQ(fake::calls(), channel.platform_calls);
     }
 
     // A test that has rows which post has one for every request that the catalogue has for the channel.

@@ -185,6 +185,7 @@ TEST_F(SharedResults, ListsOfMessageAccessAreCopiedAsFarAsTheyGo)
                                          {3, 0, 10, 0, 3},         {full, 0, 10, 0, 10},    {more, 0, more, 0, full},
                                          {~0u, 0, ~0u, 0, full},   {~0u, 0, 1, 0, 1},       {3, 0, 0, -1, 0}};
         run(list, cases);
+        run(list, {{~0u, 0, kAll, 0, full, list.size + list.entry_size}}); // an area that is too long
         for (const uint32_t maximum : {kAll, 1u})
             expect_untouched_without_area(list.area, list.size, list.size, list.entries_at, -1,
                                           [&](uint8_t* out) { return list.read(0, maximum, out); });
