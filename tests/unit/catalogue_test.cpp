@@ -60,6 +60,7 @@ TEST(CatalogueDecode, TakesFieldsApartAndMarksWhatIsMissingOrTooMuch)
     } cases[] = {
         {0xA091, "02010000", "0xA091 BT_SRV_CON_search value=258"},
         {0xA084, "010203AABBCC0909", "0xA084 BT_SRV_CON_delete address=01:02:03:AA:BB:CC"},
+        {0xA0E9, "01000000", "0xA0E9 BT_SRV_CON_setBluetoothFunction value=1"}, // the first of those that share it
         {0x2006, "FFFFFFFF", "0x2006 BT_SRV_HFP_terminateCall value=-1"},
         {0x101D, "80000001 00000100", "0x101D BT_SRV_AVP_getPlayerList w0=2147483649 w1=256"},
         {0x1024, "0002 6869", "0x1024 BT_SRV_AVP_STRCTL_setDeviceFileName length=2 name=\"hi\""},
@@ -125,7 +126,7 @@ TEST(CatalogueText, KeepsTerminalsSafe)
 {
     EXPECT_EQ(printable("Ann\xC3\xA9 \xF0\x9F\x8E\xB5"), "Ann\xC3\xA9 \xF0\x9F\x8E\xB5");
     EXPECT_EQ(printable("\x1B[31m\n"), "\\x1b[31m\\x0a");
-    EXPECT_EQ(printable("\xC3"), "\\xc3");
+    EXPECT_EQ(printable(std::string_view("\xC3\xA9", 1)), "\\xc3");
     EXPECT_EQ(printable("\xC0\xAF\xED\xA0\x80"), "\\xc0\\xaf\\xed\\xa0\\x80"); // overlong, surrogate
     EXPECT_EQ(printable("\xC2\x9B"
                         "1m"),

@@ -85,10 +85,10 @@ Call call(int32_t (*function)(Parameters...), Arguments... arguments)
     };
 }
 
-// What a request answers when the platform answers 0, -1, 2, 0x10000 and 0x10001 to the post.
-using Results = int32_t[5];
-constexpr Results kPosted = {0, -1, 2, 0x10000, 0x10001};
-constexpr Results kPassedThrough = {0, -127, 2, 0x10000, 0x10001};
+// What a request answers when the platform answers 0, -1, 2, 0x10000, 0x10001 and -2 to the post.
+using Results = int32_t[6];
+constexpr Results kPosted = {0, -1, 2, 0x10000, 0x10001, -2};
+constexpr Results kPassedThrough = {0, -127, 2, 0x10000, 0x10001, -2};
 
 struct Channel {
     uint16_t pno;

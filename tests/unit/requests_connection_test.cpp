@@ -8,8 +8,8 @@ namespace {
 using namespace requests;
 using RequestsConnection = RequestRows;
 
-constexpr Results kMinusOne = {0, -1, -1, 0, -1}; // the low half of the platform's answer tells
-constexpr Results kNotPosted = {0, -127, -127, 0, -127};
+constexpr Results kMinusOne = {0, -1, -1, 0, -1, -1}; // the low half of the platform's answer tells
+constexpr Results kNotPosted = {0, -127, -127, 0, -127, -127};
 
 const std::string kAddress = "112233445566 7788"; // the bytes behind the address travel too
 const std::string kNobody = " FF*6 7788";
@@ -76,9 +76,8 @@ TEST_F(RequestsConnection, PostAFullMessageEach)
         channel.results = &kMinusOne;
     }
     // What each profile carries behind its number when it is connected.
-    const std::string carried[] = {zeros, zeros,           zeros, "11121314 21222324 31323334 4142 00*14",
-                                   "",    kWords + "00*4", zeros, "11121314 00*24",
-                                   zeros};
+    const std::string three = "11121314 21222324 31323334 4142 00*14", seven = "11121314 00*24";
+    const std::string carried[] = {zeros, zeros, zeros, three, "", kWords + "00*4", zeros, seven, zeros};
     for (uint32_t profile = 0; profile <= 8; ++profile) {
         const std::string number = "0" + std::to_string(profile) + "000000 ", nothing_more = kAddress + number + "00*4";
         channel.results = &kMinusOne;

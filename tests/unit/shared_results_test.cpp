@@ -163,17 +163,14 @@ TEST_F(SharedResults, ListsOfAudioAndVideoAreCopiedAsFarAsTheyGo)
         const auto read = [&](uint8_t* out) { return list.read(0, 10, out); };
         expect_untouched_without_area(list.area, list.size, 0, 12, 0, read);
     }
-    for (const auto read : {BT_SRV_AVP_getMediaListData, BT_SRV_AVP_getPlayerListData}) {
-        fake::reset();
-        for (const List& list : kAudioVideoLists)
-            put_word(patterned_area(list.area, list.size) + 4, 5);
-        list_result no_room = {1, 2, nullptr};
-        EXPECT_EQ(read(0, 5, nullptr), -1);
-        EXPECT_EQ(read(4, 5, &no_room), -1);
-        EXPECT_EQ(no_room.count, 2u);
-        EXPECT_EQ(read(5, 5, &no_room), 0) << "nothing to copy";
-        EXPECT_EQ(no_room.count, 0u);
-    }
+    REFUSES(-1, BT_SRV_AVP_getMediaListData, 0, 5, nullptr);
+    REFUSES(-1, BT_SRV_AVP_getPlayerListData, 0, 5, nullptr);
+    put_word(patterned_area(kAudioVideoLists[0].area, 28812) + 4, 5);
+    list_result no_room = {1, 2, nullptr};
+    EXPECT_EQ(BT_SRV_AVP_getMediaListData(4, 5, &no_room), -1);
+    EXPECT_EQ(no_room.count, 2u);
+    EXPECT_EQ(BT_SRV_AVP_getMediaListData(5, 5, &no_room), 0) << "nothing to copy";
+    EXPECT_EQ(no_room.count, 0u);
 }
 
 TEST_F(SharedResults, ListsOfMessageAccessAreCopiedAsFarAsTheyGo)
@@ -300,10 +297,11 @@ TEST_F(SharedResults, PushFillsTheAreaButForTheUnusedGroups)
         EXPECT_THAT(fake::sizes_asked(), testing::ElementsAre(9652u));
         EXPECT_EQ(BT_SRV_MAP_setPushMessageData(pushed(nullptr, 0)), 0);
     }
-    const push_record record = pushed(fake::guarded(1), 1);
+    fake::reset();
+    const push_record record = pushed(nullptr, 0);
     expect_untouched_without_area(name, 9652, 9652, 8152, -1,
                                   [=](uint8_t*) { return BT_SRV_MAP_setPushMessageData(record); });
-    EXPECT_EQ(fake::find_area(name)[0], 1) << "the pattern";
+    EXPECT_EQ(fake::find_area(name)[8148], 0xed) << "the area's own pattern";
 }
 
 // ---- server instances
