@@ -68,31 +68,24 @@ using requests::call, requests::heap_calls_of;
 
 BtMessage message = {}, taken;
 
-TEST(NoHeap, DataStore)
+TEST(NoHeap, StoreFrameworkAndEvents)
 {
-    const char *const address = "00*8", *const memory = "01 00*20000";
+    const char *const address = "00*8", *const memory = "00*20000";
     fake::reset();
     fake::area("BT_CON_SHARE_DATA_NAME", 27796);
+    fake::area("/tmp/shm_eds_regist_table", 8004);
     g_bt_con_share = {};
     for (const requests::Call& store :
          {call(bt_con_ApiInit, 0), call(bt_con_setRegisteredDeviceListInfoNoFROMWrite, "01 00*17343", 1),
-          call(bt_con_getRegisteredDeviceListInfo, memory, 1), call(bt_con_setSearchDevlist, memory, 1),
+          call(bt_con_getRegisteredDeviceListInfo, memory, 1),
           call(bt_con_getRegDev, address, memory, memory, memory, memory, memory),
-          call(bt_con_getRegisterDeviceName, address, memory), call(bt_con_getRegisterDeviceIndex, address),
-          call(bt_con_getallOrderList, memory), call(bt_con_getallConnectOrder, memory, 1),
-          call(bt_con_addSearchdevlist, memory), call(bt_con_delSearchdevlist),
-          call(bt_con_getSettingStatusVtype, memory, 1), call(bt_con_setSettingStatusVtype, 7, 1),
+          call(bt_con_getallConnectOrder, memory, 1), call(bt_con_addSearchdevlist, memory),
+          call(bt_con_delSearchdevlist), call(bt_con_setSettingStatusVtype, 7, 1),
           call(BT_SRV_CON_getConnectionMode, address, memory), call(BT_SRV_CON_getRemoteDeviceInfo, address, memory),
-          call(bt_con_IsCheckRegDevSupportProfile, "00*2000", 1), call(bt_con_IsCheckProfileFilter, "00*2000", 1),
-          call(BT_SRV_CON_getScanMode, memory), call(BT_SRV_CON_getDiscoverableMode, memory)})
+          call(bt_con_IsCheckRegDevSupportProfile, memory, 1), call(BT_SRV_CON_getScanMode, memory)})
         EXPECT_EQ(store(), 0);
-    call(bt_con_SearshOrderListAddr, address, memory)(); // which find nothing
-    call(BT_SRV_CON_getRemoteDeviceDIDInfo, address, 1, memory)();
     g_bt_con_share = {}; // its area is gone
-}
 
-TEST(NoHeap, FrameworkAndEvents)
-{
     const BtStateRow states[] = {{1, BT_CMN_nopEntryExit, BT_CMN_nopEntryExit, nullptr},
                                  {2, BT_CMN_nopEntryExit, BT_CMN_nopEntryExit, &states[0]},
                                  {BT_TABLE_END, nullptr, nullptr, nullptr}};
@@ -101,29 +94,24 @@ TEST(NoHeap, FrameworkAndEvents)
     const BtFunctionIdRow machines[] = {{1, [] { return uint32_t{0xFFFE}; }, matrix}, {BT_TABLE_END, nullptr, nullptr}};
     const std::string name = "/bt_no_heap_" + std::to_string(getpid());
     BtShmHandle object = {name.c_str(), 4096, -1, nullptr};
-    fake::reset();
-    fake::area("/tmp/shm_eds_regist_table", 8004);
     fake::incoming(fake::Bytes(1024, 0));
-    const uint32_t calls = heap_calls_of([&] {
-        BT_CMN_sendMsgWrapper("f", "g", 1, 0x4001, &message);
-        BT_CMN_recvMsgWrapper("f", "g", 1, &taken);
-        BT_CMN_startTimer(1, 2);
-        BT_CMN_stopTimer(1);
-        uint32_t state = 1;
-        BT_CMN_changeStatus(&state, 2, states);
-        BT_CMN_doMtxFunc(&message, dispatch, machines);
-        BT_CMN_createShm(&object);
-        BT_CMN_destroyShm(&object);
-        BT_CMN_logdump("CMN", "t", message.payload, 100);
-
-        BT_EDS_initialize();
-        const uint32_t id = 0xA891, listener = BT_SRV_EvtSrv_regist(0x4001, 1, 1, &id);
-        BT_SRV_EvtSrv_suspend(listener);
-        BT_SRV_EvtSrv_resume(listener);
-        BT_EDS_dispatch(0, &message);
-        BT_SRV_EvtSrv_deregist(listener);
-    });
-    EXPECT_EQ(calls, 0u);
+    EXPECT_EQ(heap_calls_of([&] {
+                  uint32_t state = 1;
+                  const uint32_t id = 0xA891;
+                  BT_CMN_sendMsgWrapper("f", "g", 1, 0x4001, &message);
+                  BT_CMN_recvMsgWrapper("f", "g", 1, &taken);
+                  BT_CMN_startTimer(1, 2);
+                  BT_CMN_changeStatus(&state, 2, states);
+                  BT_CMN_doMtxFunc(&message, dispatch, machines);
+                  BT_CMN_createShm(&object);
+                  BT_CMN_destroyShm(&object);
+                  BT_CMN_logdump("CMN", "t", message.payload, 100);
+                  BT_EDS_initialize();
+                  const uint32_t listener = BT_SRV_EvtSrv_regist(0x4001, 1, 1, &id);
+                  BT_EDS_dispatch(0, &message);
+                  BT_SRV_EvtSrv_deregist(listener);
+              }),
+              0u);
     EXPECT_EQ(object.addr, nullptr);
 }
 
