@@ -8,13 +8,12 @@ namespace {
 using namespace requests;
 using RequestsSystem = RequestRows;
 
-const Channel kSystem = {0x08C1, 0, 0, &kPassedThrough};
 const std::vector<std::string> kSetUp = {"SetupZX44API(1)"};
 
 TEST_F(RequestsSystem, PostHeaderAndPayload)
 {
     const char *const sco = "0102 A1*4 FDFE", *const fts = "0102 A1*38 FDFE", *const snapshot = "01 A1*62 FE";
-    channel = kSystem;
+    channel = {0x08C1, 0, 0, &kPassedThrough};
     POSTS(BT_SRV_deinitialize, 0x1110, "44332211", 0x11223344);
     POSTS(BT_SRV_shutdown, 0x1102, "");
     POSTS(BT_SRV_radioShutdown, 0x1103, "");
