@@ -1,29 +1,19 @@
-// A domain for each test, and children that are told and watched through pipes.
+// A domain for each test, and messages that show when they are torn.
 #pragma once
+
+#include "process.h"
 
 #include <bt_platform/host.h>
 #include <bt_service/bt_message.h>
 
-#include <gtest/gtest.h>
-
-#include <sys/wait.h>
-#include <unistd.h>
-
-#include <csignal>
+#include <algorithm>
 #include <cstdlib>
 #include <cstring>
-#include <functional>
-#include <string>
 
-namespace platform_test {
+namespace bt::test {
 
 constexpr uint32_t kPno = 0x08C1;
-
-inline std::string new_domain_name()
-{
-    static int count = 0;
-    return "t" + std::to_string(getpid()) + "_" + std::to_string(++count);
-}
+constexpr int32_t kLongMs = 20000; // for what has to come; never waited out
 
 // The test process does not create the domain, nor map anything of it, before the test does.
 class EmptyDomain : public testing::Test {
@@ -33,7 +23,6 @@ protected:
         setenv("BT_PLATFORM_DOMAIN", name.c_str(), 1);
         unsetenv("BT_PLATFORM_PNO");
     }
-
     ~EmptyDomain() override
     {
         bt_host_release_pno();
@@ -41,7 +30,7 @@ protected:
         bt_host_remove_domain();
     }
 
-    const std::string name = new_domain_name();
+    const std::string name = "t" + std::to_string(getpid());
 };
 
 class Domain : public EmptyDomain {
@@ -49,116 +38,28 @@ protected:
     Domain() { EXPECT_EQ(bt_host_create_domain(), 0) << bt_host_error(); }
 };
 
-// The way between parent and child: either side says a byte, the other waits for it.
-class Line {
-public:
-    Line()
-    {
-        if (pipe(up_) != 0 || pipe(down_) != 0) std::abort();
-    }
-    ~Line()
-    {
-        for (const int fd : {up_[0], up_[1], down_[0], down_[1]})
-            close(fd);
-    }
-    Line(const Line&) = delete;
-    Line& operator=(const Line&) = delete;
-
-    void say_to_parent() { say(up_[1]); }
-    void say_to_child() { say(down_[1]); }
-    void hear_child() { hear(up_[0]); }
-    void hear_parent() { hear(down_[0]); }
-
-private:
-    static void say(int fd)
-    {
-        if (write(fd, "!", 1) != 1) std::abort();
-    }
-    static void hear(int fd)
-    {
-        char byte = 0;
-        while (read(fd, &byte, 1) == -1 && errno == EINTR) {
-        }
-    }
-
-    int up_[2], down_[2];
+class OwnedNumber : public Domain {
+protected:
+    OwnedNumber() { EXPECT_EQ(bt_host_claim_pno(kPno), 0) << bt_host_error(); }
 };
 
-// A child process that runs `body`; the expectations in it count as its result.
-class Child {
-public:
-    explicit Child(const std::function<void()>& body) : pid(fork())
-    {
-        if (pid != 0) return;
-        body();
-        std::_Exit(testing::Test::HasFailure() ? 1 : 0);
-    }
-    ~Child()
-    {
-        if (!waited_) kill_now();
-    }
-    Child(const Child&) = delete;
-    Child& operator=(const Child&) = delete;
-
-    // True when it ended by itself and no expectation in it failed.
-    bool succeeded()
-    {
-        const int status = wait_for_end();
-        return WIFEXITED(status) && WEXITSTATUS(status) == 0;
-    }
-
-    int exit_code()
-    {
-        const int status = wait_for_end();
-        return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
-    }
-
-    void kill_now()
-    {
-        kill(pid, SIGKILL);
-        wait_for_end();
-    }
-
-    const pid_t pid;
-
-private:
-    int wait_for_end()
-    {
-        int status = 0;
-        while (waitpid(pid, &status, 0) == -1 && errno == EINTR) {
-        }
-        waited_ = true;
-        return status;
-    }
-
-    bool waited_ = false;
-};
-
-inline bool in_child(const std::function<void()>& body)
+inline bool error_names(const std::string& part)
 {
-    return Child(body).succeeded();
+    return std::string(bt_host_error()).find(part) != std::string::npos;
 }
 
-// A message that shows when it is torn: every payload word holds its number.
+// Every payload word holds the message's number.
 struct Numbered {
-    BtMessageHeaderFields header;
+    BtMessageHeaderFields header{};
     uint32_t words[252];
 
-    explicit Numbered(uint32_t number = 0, uint16_t sender = 0) : header{}
+    explicit Numbered(uint32_t number = 0, uint16_t sender = 0)
     {
         header.src_pno = sender;
         header.len = sizeof words;
-        for (uint32_t& word : words)
-            word = number;
+        std::fill(std::begin(words), std::end(words), number);
     }
-
-    bool whole() const
-    {
-        for (const uint32_t word : words) {
-            if (word != words[0]) return false;
-        }
-        return true;
-    }
+    bool whole() const { return std::count(std::begin(words), std::end(words), words[0]) == 252; }
 };
 static_assert(sizeof(Numbered) == BT_MESSAGE_SIZE, "a numbered message fills its slot");
 
@@ -168,21 +69,38 @@ inline int32_t post(const Numbered& message, uint32_t pno = kPno)
 }
 
 // Posts and waits for room where there is none.
-inline int32_t post_patiently(const Numbered& message, uint32_t pno = kPno)
+inline int32_t post_patiently(const Numbered& message)
 {
-    int32_t result = post(message, pno);
-    while (result == 2 || result == 4) {
+    int32_t result = post(message);
+    for (; result == 2 || result == 4; result = post(message))
         sched_yield();
-        result = post(message, pno);
-    }
     return result;
 }
 
-inline int32_t receive(Numbered* message, int32_t timeout_ms)
+inline int32_t receive(Numbered* message, int32_t timeout_ms = kLongMs)
 {
     return bt_host_receive(message, sizeof *message, timeout_ms);
 }
 
-constexpr int32_t kLongMs = 20000; // for what has to come; never waited out
+inline BtHostQueue first_queue()
+{
+    BtHostQueue queue{};
+    EXPECT_EQ(bt_host_list_queues(&queue, 1), 1) << bt_host_error();
+    return queue;
+}
 
-} // namespace platform_test
+inline BtHostLock first_lock()
+{
+    BtHostLock lock{};
+    EXPECT_EQ(bt_host_list_locks(&lock, 1), 1) << bt_host_error();
+    return lock;
+}
+
+inline void* link_data(const char* data, uint32_t* size = nullptr)
+{
+    void* address = nullptr;
+    EXPECT_EQ(_sys_LinkShareData(data, &address, size), 0) << bt_host_error();
+    return address;
+}
+
+} // namespace bt::test

@@ -1,78 +1,154 @@
-// A simulated unit under test, and applications that talk to it. Units and applications are processes of their own, so
-// each test may use several domains; the test's own process never touches the platform layer.
+// A simulated unit under test, the applications in its domain, and the programs run on it. All are processes of their own,
+// so each test may use several domains.
 #pragma once
 
+#include "process.h"
 #include "sim/unit_records.h"
 
+#include <bt_platform/host.h>
 #include <bt_service/bt_service.h>
 #include <bt_sim/events.h>
 
-#include <functional>
+#include <fcntl.h>
+
+#include <cstring>
+#include <filesystem>
 #include <string>
-#include <sys/types.h>
 #include <vector>
 
 namespace bt::test {
 
-// The program under test: BTSVC_SIM_PATH of the environment, else the one of this build.
-std::string sim_path();
-
-class SimUnit {
-public:
-    // Starts a unit with a shipped scenario and waits until it is ready or has ended.
-    SimUnit(std::string domain, const std::string& root, const std::string& scenario = "two_phones");
-    ~SimUnit();
-    SimUnit(const SimUnit&) = delete;
-    SimUnit& operator=(const SimUnit&) = delete;
-
-    bool ready() const { return ready_; }
-    const std::string& domain() const { return domain_; }
-    void send_signal(int signal) const;
-    // The exit code of the unit, minus the signal that ended it.
-    int wait_for_end();
-
-private:
-    std::string domain_;
-    pid_t pid_ = -1;
-    bool ready_ = false;
-    int end_ = 0;
+struct Ended {
+    int code;
+    std::string out, err;
 };
 
-// A folder that goes when the test ends.
-class TemporaryRoot {
+// A program whose output is kept.
+class Program {
 public:
-    TemporaryRoot();
-    ~TemporaryRoot();
-    const std::string& path() const { return path_; }
+    Program(const char* path, std::vector<std::string> words, bool closed_output = false)
+        : process_([&] {
+              out_.take(STDOUT_FILENO);
+              err_.take(STDERR_FILENO);
+              if (closed_output) close(STDOUT_FILENO);
+              become(path, words);
+          })
+    {
+    }
+    Ended end(int signal = 0)
+    {
+        const int code = process_.end(signal);
+        return {code, out_.text(), err_.text()};
+    }
+
+    [[noreturn]] static void become(const char* path, std::vector<std::string> words)
+    {
+        std::vector<char*> arguments{const_cast<char*>(path)};
+        for (std::string& word : words)
+            arguments.push_back(word.data());
+        arguments.push_back(nullptr);
+        execv(path, arguments.data());
+        _exit(126);
+    }
 
 private:
-    std::string path_;
+    Capture out_, err_;
+    Child process_;
 };
 
-// The objects in shared memory that carry the domain's name.
-std::vector<std::string> objects_of(const std::string& domain);
+// A unit with a shipped scenario and a root folder of its own.
+struct Unit {
+    explicit Unit(const std::string& name, const std::string& scenario = "two_phones")
+        : domain(name + "-" + std::to_string(getpid())), process([&] {
+              fcntl(line_to_parent, F_SETFD, 0);
+              Program::become(BTSVC_SIM_PATH, {"--scenario", BTSVC_SCENARIOS + scenario + ".json", "--domain", domain,
+                                               "--root", root, "--ready-fd", std::to_string(line_to_parent)});
+          })
+    {
+    }
+    ~Unit()
+    {
+        process.end(SIGTERM);
+        std::filesystem::remove_all(root);
+    }
 
-// Runs the body as an application of the domain, with a process number, and expects it to end without a failed check.
-void as_application(const std::string& domain, const std::function<void()>& body);
+    const std::string domain;
+    std::string root = std::filesystem::temp_directory_path() / "btsim-test-XXXXXX";
+    const bool has_root = mkdtemp(root.data()) != nullptr;
+    Child process;
+    const bool ready = hear(process.line); // or has ended
+};
 
-// For applications: registers for events; what comes without being registered for is none of the test's business.
-uint32_t listen_for(const std::vector<uint32_t>& event_ids);
+// Becomes an application of the domain, with a process number; for children.
+inline void be_application(const std::string& domain, const std::function<void()>& body)
+{
+    setenv("BT_PLATFORM_DOMAIN", domain.c_str(), 1);
+    ASSERT_EQ(0, bt_host_claim_pno(BT_HOST_ANY_PNO)) << bt_host_error();
+    body();
+    bt_host_release_pno();
+}
 
-// The next message of this application; its payload fields are read with word(). Fails the test when none comes.
-BtMessage next_event();
-// Drops events until one with the id comes.
-BtMessage wait_for(uint32_t event_id);
-uint32_t word(const BtMessage& event, size_t offset);
+inline void as_application(const std::string& domain, const std::function<void()>& body)
+{
+    EXPECT_TRUE(in_child([&] { be_application(domain, body); }));
+}
 
-BtDevAddress device_address(uint8_t first, uint8_t last);
+inline uint32_t listen_for(const std::vector<uint32_t>& ids)
+{
+    const uint32_t handle = BT_SRV_EvtSrv_regist(_sys_GetPno(), 0, static_cast<uint32_t>(ids.size()), ids.data());
+    EXPECT_NE(0U, handle) << bt_host_error();
+    return handle;
+}
 
-void request_connection(const BtDevAddress& address, uint32_t profile);
-int32_t registered_count();
-uint32_t connection_mode(const BtDevAddress& address);
+// The next message of this application; ends it when none comes.
+inline BtMessage next_event()
+{
+    BtMessage event{};
+    if (bt_host_receive(&event, sizeof event, 20000) == 1) return event;
+    ADD_FAILURE() << "no event came: " << bt_host_error();
+    std::_Exit(1);
+}
 
-// The record that the supervisor keeps about the service at the number.
-BtSimService service_at(uint32_t pno);
-// Kills the service; what is posted to it from then on waits until it is back.
-void kill_connection_service();
+// A payload word of the next event with the id; others are dropped.
+inline uint32_t wait_for(uint32_t id, size_t offset = 0)
+{
+    const testing::ScopedTrace trace(__FILE__, __LINE__, "waiting for event " + std::to_string(id));
+    BtMessage event = next_event();
+    while (event.msg_header.hdr.cid != id)
+        event = next_event();
+    uint32_t value = 0;
+    EXPECT_LE(offset + sizeof value, event.msg_header.hdr.len);
+    std::memcpy(&value, event.payload + offset, sizeof value);
+    return value;
+}
+
+// Posts a connection request and compares a payload word of the event that comes of it.
+#define EXPECT_ANSWER(call, event, offset, value)                                                                      \
+    EXPECT_EQ(0, BT_SRV_CON_##call);                                                                                   \
+    EXPECT_EVENT(event, offset, value)
+#define EXPECT_EVENT(event, offset, value)                                                                             \
+    EXPECT_EQ(static_cast<uint32_t>(value), wait_for(BT_SIM_EVENT_CON_##event, offset))
+
+constexpr BtDevAddress phone(uint8_t first, uint8_t last)
+{
+    return {{first, 0, 0, 0, 0, last}, {0, 0}};
+}
+constexpr BtDevAddress kAnna = phone(0xA0, 1);
+
+// A record that the unit keeps about itself.
+template <class Record>
+const Record& record_of_unit(const char* name)
+{
+    void* address = nullptr;
+    uint32_t size = sizeof(Record);
+    EXPECT_EQ(0, _sys_LinkShareData(name, &address, &size)) << bt_host_error();
+    return *static_cast<const Record*>(address);
+}
+
+inline const BtSimService& connection_service()
+{
+    const auto& services = record_of_unit<BtSimUnit>(kUnitDataName).services;
+    return *std::find_if(std::begin(services), std::end(services), [](auto& s) { return s.pno == PNO_BT_CON; });
+}
 
 } // namespace bt::test

@@ -1,198 +1,141 @@
 // The simulated unit as a whole: its domain, its end, its scenario, and the delivery of events.
 #include "sim_unit.h"
 
-#include <bt_platform/host.h>
 #include <gmock/gmock.h>
-#include <gtest/gtest.h>
 
-#include <csignal>
-#include <cstdio>
 #include <fstream>
-#include <memory>
-#include <sys/wait.h>
-#include <unistd.h>
+#include <regex>
 
 namespace bt::test {
 namespace {
 
-const BtDevAddress kAnna = device_address(0xA0, 1);
-
-constexpr int kDomainTaken = 3;
-
-uint32_t disconnect_all_result()
-{
-    EXPECT_EQ(0, BT_SRV_CON_requestAllDisconnection(1, &kAnna));
-    return word(wait_for(BT_SIM_EVENT_CON_ALL_DISCONNECTION), 0);
-}
+constexpr uint32_t kCancelled = BT_SIM_EVENT_CON_CANCEL_SEARCH;
+constexpr uint32_t kDisconnected = BT_SIM_EVENT_CON_ALL_DISCONNECTION;
 
 void expect_service_works()
 {
-    listen_for({BT_SIM_EVENT_CON_ALL_DISCONNECTION});
-    EXPECT_EQ(BT_SIM_OK, disconnect_all_result());
+    listen_for({kDisconnected});
+    EXPECT_ANSWER(requestAllDisconnection(1, &kAnna), ALL_DISCONNECTION, 0, BT_SIM_OK);
 }
 
-TEST(SimUnit, EndLeavesNothingInSharedMemory)
+std::vector<std::string> objects_of(const std::string& domain)
 {
-    for (const int signal : {SIGTERM, SIGINT}) {
-        TemporaryRoot root;
-        SimUnit unit("sim-end", root.path());
-        ASSERT_TRUE(unit.ready());
-        EXPECT_THAT(objects_of(unit.domain()), testing::Not(testing::IsEmpty()));
-        as_application(unit.domain(), expect_service_works);
-        unit.send_signal(signal);
-        EXPECT_EQ(0, unit.wait_for_end());
-        EXPECT_THAT(objects_of(unit.domain()), testing::IsEmpty());
-    }
+    std::vector<std::string> names;
+    for (const auto& entry : std::filesystem::directory_iterator("/dev/shm"))
+        if (entry.path().string().find(domain) != std::string::npos) names.push_back(entry.path());
+    return names;
 }
 
-TEST(SimUnit, UnitsInTwoDomainsDoNotSeeEachOther)
+TEST(SimUnit, UnitsInTwoDomainsDoNotSeeEachOtherAndLeaveNothingInSharedMemory)
 {
-    TemporaryRoot root_a;
-    TemporaryRoot root_b;
-    SimUnit a("sim-a", root_a.path());
-    SimUnit b("sim-b", root_b.path());
-    ASSERT_TRUE(a.ready() && b.ready());
-    as_application(a.domain(), [] {
+    Unit a("sim-a");
+    Unit b("sim-b");
+    ASSERT_TRUE(a.ready && b.ready);
+    as_application(a.domain, [] {
         const BtConParameters parameters = {0, {}};
         listen_for({BT_SIM_EVENT_CON_CONNECTION});
-        ASSERT_EQ(0, BT_SRV_CON_requestConnection(&kAnna, &parameters));
-        EXPECT_EQ(BT_SIM_OK, word(wait_for(BT_SIM_EVENT_CON_CONNECTION), 0));
+        EXPECT_ANSWER(requestConnection(&kAnna, &parameters), CONNECTION, 0, BT_SIM_OK);
     });
-    for (const auto& [unit, registered] : {std::pair<const SimUnit*, int32_t>{&a, 0}, {&b, -1}}) {
-        as_application(unit->domain(), [registered = registered] {
+    const auto expect_registered = [](const Unit& unit, int32_t result) {
+        as_application(unit.domain, [result] {
             uint32_t mode = 0;
-            EXPECT_EQ(registered, BT_SRV_CON_getConnectionMode(&kAnna, &mode));
+            EXPECT_EQ(result, BT_SRV_CON_getConnectionMode(&kAnna, &mode));
         });
+    };
+    expect_registered(a, 0);
+    expect_registered(b, -1);
+    for (auto& [unit, signal] : {std::pair<Unit&, int>{a, SIGTERM}, {b, SIGINT}}) {
+        as_application(unit.domain, expect_service_works);
+        EXPECT_THAT(objects_of(unit.domain), testing::Not(testing::IsEmpty()));
+        EXPECT_EQ(0, unit.process.end(signal));
+        EXPECT_THAT(objects_of(unit.domain), testing::IsEmpty());
     }
 }
 
-TEST(SimUnit, DomainOfALiveUnitIsRefused)
+TEST(SimUnit, DomainIsTakenOverFromADeadUnitOnlyAndItsApplicationsGoOn)
 {
-    TemporaryRoot root;
-    SimUnit first("sim-taken", root.path());
-    ASSERT_TRUE(first.ready());
-    SimUnit second("sim-taken", root.path());
-    EXPECT_FALSE(second.ready());
-    EXPECT_EQ(kDomainTaken, second.wait_for_end());
-    as_application(first.domain(), expect_service_works);
-}
+    Unit first("sim-taken");
+    ASSERT_TRUE(first.ready);
+    Unit second("sim-taken");
+    EXPECT_FALSE(second.ready);
+    EXPECT_EQ(3, second.process.end());
 
-TEST(SimUnit, DomainOfADeadUnitIsTakenOver)
-{
-    TemporaryRoot root;
-    SimUnit dead("sim-dead", root.path());
-    ASSERT_TRUE(dead.ready());
-    dead.send_signal(SIGKILL);
-    EXPECT_EQ(-SIGKILL, dead.wait_for_end());
-    SimUnit next("sim-dead", root.path());
-    ASSERT_TRUE(next.ready());
-    as_application(next.domain(), expect_service_works);
-}
-
-TEST(SimUnit, ApplicationThatOutlivesItsUnitGoesOnWithTheNextOne)
-{
-    TemporaryRoot root;
-    SimUnit dead("sim-outlived", root.path());
-    ASSERT_TRUE(dead.ready());
-    as_application(dead.domain(), [&] {
-        expect_service_works();
-        dead.send_signal(SIGKILL);
-        // The domain is taken until the kernel has removed the dead unit.
-        auto next = std::make_unique<SimUnit>("sim-outlived", root.path());
-        while (!next->ready() && next->wait_for_end() == kDomainTaken)
-            next = std::make_unique<SimUnit>("sim-outlived", root.path());
-        ASSERT_TRUE(next->ready());
-        expect_service_works();
+    Child application([&] {
+        be_application(first.domain, [] {
+            expect_service_works();
+            stand();
+            expect_service_works();
+        });
     });
+    hear(application.line);
+    first.process.end(SIGKILL);
+    const Unit next("sim-taken");
+    ASSERT_TRUE(next.ready);
+    say(application.line);
+    EXPECT_EQ(application.end(), 0);
 }
 
 TEST(SimUnit, SuspendedListenerGetsNothingUntilItIsResumed)
 {
-    TemporaryRoot root;
-    SimUnit unit("sim-suspend", root.path());
-    ASSERT_TRUE(unit.ready());
-    as_application(unit.domain(), [] {
-        const uint32_t searches = listen_for({BT_SIM_EVENT_CON_CANCEL_SEARCH});
-        listen_for({BT_SIM_EVENT_CON_ALL_DISCONNECTION});
+    const Unit unit("sim-suspend");
+    ASSERT_TRUE(unit.ready);
+    as_application(unit.domain, [] {
+        const uint32_t searches = listen_for({kCancelled});
+        listen_for({kDisconnected});
         BT_SRV_EvtSrv_suspend(searches);
         ASSERT_EQ(0, BT_SRV_CON_cancelSearch());
         ASSERT_EQ(0, BT_SRV_CON_requestAllDisconnection(1, &kAnna));
-        EXPECT_EQ(BT_SIM_EVENT_CON_ALL_DISCONNECTION, next_event().msg_header.hdr.cid);
+        EXPECT_EQ(kDisconnected, next_event().msg_header.hdr.cid);
         BT_SRV_EvtSrv_resume(searches);
         ASSERT_EQ(0, BT_SRV_CON_cancelSearch());
-        EXPECT_EQ(BT_SIM_EVENT_CON_CANCEL_SEARCH, next_event().msg_header.hdr.cid);
+        EXPECT_EQ(kCancelled, next_event().msg_header.hdr.cid);
     });
 }
 
 const BtSimListenerCount& count_of(uint32_t handle)
 {
-    static const BtSimListenerCount none{};
-    void* address = nullptr;
-    uint32_t size = sizeof(BtSimDistributor);
-    EXPECT_EQ(0, _sys_LinkShareData(kDistributorDataName, &address, &size));
-    for (const BtSimListenerCount& count : static_cast<const BtSimDistributor*>(address)->listeners)
-        if (count.handle == handle) return count;
-    return none;
+    const auto& counts = record_of_unit<BtSimDistributor>(kDistributorDataName).listeners;
+    return *std::find_if(std::begin(counts), std::end(counts) - 1, [=](auto& count) { return count.handle == handle; });
 }
 
 // One listener never takes its events, one does not exist, one would hand every event back: those who listen behind
 // them in the table miss none.
 TEST(SimUnit, BrokenListenersDelayNobody)
 {
-    TemporaryRoot root;
-    SimUnit unit("sim-broken", root.path());
-    ASSERT_TRUE(unit.ready());
-    int full[2];
-    int done[2];
-    ASSERT_TRUE(pipe(full) == 0 && pipe(done) == 0);
-    const pid_t lazy = fork();
-    if (lazy == 0) {
-        close(done[1]);
-        as_application(unit.domain(), [&] {
-            const uint32_t handle = listen_for({BT_SIM_EVENT_CON_CANCEL_SEARCH});
-            ASSERT_EQ(4, write(full[1], &handle, sizeof handle));
-            char end = 0;
-            EXPECT_EQ(0, read(done[0], &end, 1)) << "the other side closes when it is done";
+    const Unit unit("sim-broken");
+    ASSERT_TRUE(unit.ready);
+    Child lazy([&] {
+        be_application(unit.domain, [] {
+            listen_for({kCancelled});
+            stand();
         });
-        _exit(testing::Test::HasFailure() ? 1 : 0);
-    }
-    close(done[0]);
-    uint32_t lazy_handle = 0;
-    ASSERT_EQ(4, read(full[0], &lazy_handle, sizeof lazy_handle));
-
-    as_application(unit.domain(), [&] {
-        const uint32_t wanted = BT_SIM_EVENT_CON_CANCEL_SEARCH;
-        const uint32_t gone = BT_SRV_EvtSrv_regist(0x7777, 0, 1, &wanted);
-        const uint32_t circle = BT_SRV_EvtSrv_regist(PNO_BT_EDS, 0, 1, &wanted);
-        const uint32_t mine = listen_for({wanted});
-        while (count_of(lazy_handle).full < 20) {
+    });
+    hear(lazy.line);
+    as_application(unit.domain, [] {
+        const auto& first = record_of_unit<BtSimDistributor>(kDistributorDataName).listeners[0];
+        const uint32_t gone = BT_SRV_EvtSrv_regist(0x7777, 0, 1, &kCancelled);
+        const uint32_t circle = BT_SRV_EvtSrv_regist(PNO_BT_EDS, 0, 1, &kCancelled);
+        const uint32_t mine = listen_for({kCancelled});
+        while (first.full < 20) {
             ASSERT_EQ(0, BT_SRV_CON_cancelSearch());
-            ASSERT_EQ(wanted, next_event().msg_header.hdr.cid);
+            ASSERT_EQ(kCancelled, next_event().msg_header.hdr.cid);
         }
         EXPECT_EQ(0U, count_of(mine).full + count_of(mine).failed + count_of(mine).gone);
         EXPECT_EQ(0U, count_of(circle).delivered);
         EXPECT_EQ(nullptr, find_HdlList(gone)) << "nobody owns its number, so it loses its registration";
-        EXPECT_NE(nullptr, find_HdlList(lazy_handle)) << "its process lives";
+        EXPECT_NE(nullptr, find_HdlList(first.handle)) << "its process lives";
     });
-    close(done[1]);
-    int status = 0;
-    ASSERT_EQ(lazy, waitpid(lazy, &status, 0));
-    EXPECT_EQ(0, status);
+    say(lazy.line);
+    EXPECT_EQ(lazy.end(), 0);
 }
 
-struct BadScenario {
-    const char* text;
-    const char* complaint; // the place in the file, and part of the remedy
-};
-
+TEST(SimScenario, WrongFileIsRefusedWithPlaceAndRemedy)
+{
 // What a scenario looks like around a phone.
 #define PHONE(fields)                                                                                                   \
     R"({"local":{"name":"u","address":"00:00:00:00:00:01"},"phones":[{"name":"p","address":"A0:00:00:00:00:01")" fields \
     "}]}"
-
-TEST(SimScenario, WrongFileIsRefusedWithPlaceAndRemedy)
-{
-    const BadScenario rows[] = {
+    const std::pair<const char*, const char*> rows[] = {
         {"", "is not JSON"},
         {"[]", "/: is array; write an object"},
         {"{}", "/local/name: is missing"},
@@ -212,18 +155,14 @@ TEST(SimScenario, WrongFileIsRefusedWithPlaceAndRemedy)
         {PHONE(R"(,"services":["11"])"), "/phones/0/services: .*4, 8 or 32"},
         {PHONE(R"(},{"name":"q","address":"a0:00:00:00:00:01")"), "/phones/1/address: .*earlier phone"},
     };
-    TemporaryRoot root;
-    const std::string file = root.path() + "/scenario.json";
-    for (const BadScenario& row : rows) {
-        SCOPED_TRACE(row.text);
-        std::ofstream(file) << row.text;
-        FILE* const output = popen((sim_path() + " --check --scenario " + file + " 2>&1").c_str(), "r");
-        ASSERT_NE(nullptr, output);
-        char line[1024] = {};
-        EXPECT_NE(nullptr, fgets(line, sizeof line, output));
-        EXPECT_EQ(2, WEXITSTATUS(pclose(output)));
-        EXPECT_THAT(line, testing::ContainsRegex(file + ": .*" + row.complaint));
+    const std::string file = testing::TempDir() + "scenario-" + std::to_string(getpid()) + ".json";
+    for (const auto& [text, complaint] : rows) {
+        std::ofstream(file) << text;
+        const Ended check = Program(BTSVC_SIM_PATH, {"--check", "--scenario", file}).end();
+        EXPECT_EQ(2, check.code) << text;
+        EXPECT_TRUE(std::regex_search(check.err, std::regex(file + ": .*" + complaint))) << text << "\n" << check.err;
     }
+    std::filesystem::remove(file);
 }
 
 } // namespace
