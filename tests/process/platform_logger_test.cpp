@@ -3,6 +3,7 @@
 
 #include <bt_service/bt_log.h>
 
+#include <array>
 #include <regex>
 #include <sstream>
 #include <thread>

@@ -132,7 +132,7 @@ TEST_F(PlatformMessages, DescriptorIsReadableExactlyWhileMessagesWait)
     Numbered message;
     for (int round = 0; round < 200; ++round) {
         ASSERT_EQ(poll(&readable, 1, 0), 0) << "round " << round;
-        ASSERT_EQ(post(message) + post(message), 0);
+        ASSERT_EQ(post(message) | post(message), 0);
         for (int waiting = 2; waiting > 0; --waiting) {
             ASSERT_EQ(poll(&readable, 1, kLongMs), 1);
             ASSERT_EQ(receive(&message, 0), 1);
@@ -147,10 +147,10 @@ TEST_F(PlatformMessages, DescriptorIsReadableExactlyWhileMessagesWait)
 TEST_F(PlatformNumbers, NumberHasOneLivingOwner)
 {
     Child owner([&] {
-        ASSERT_EQ(bt_host_claim_pno(kPno) + bt_host_claim_pno(kPno), 0);
+        ASSERT_EQ(bt_host_claim_pno(kPno) | bt_host_claim_pno(kPno), 0);
         EXPECT_EQ(bt_host_claim_pno(kPno + 1), -1) << "a second number";
-        std::thread([] { EXPECT_EQ(_sys_GetPno(), kPno); }).join(); // the owner is the process, not the thread
         std::thread receiver([] {
+            EXPECT_EQ(_sys_GetPno(), kPno) << "the owner is the process, not the thread";
             say(line_to_parent);
             Numbered message;
             EXPECT_EQ(receive(&message), -1) << "the release ends it";
@@ -186,7 +186,6 @@ TEST_F(PlatformNumbers, ChildOfAnOwnerOwnsNothing)
 
     EXPECT_TRUE(in_child([&] {
         EXPECT_EQ(_sys_GetPno(), 0U);
-        EXPECT_EQ(_sys_RcvMsg(kPno, sizeof message, &message, 0), -1);
         EXPECT_EQ(receive(&message, 0), -1);
         EXPECT_EQ(bt_host_receive_fd(), -1);
         EXPECT_NE(_sys_ReqTimerStart(kPno, 6, 2, 0), 0);

@@ -24,29 +24,17 @@ protected:
     }
 };
 
-TEST_F(PlatformTimers, ExpireInTheOrderOfTheirTimes)
+TEST_F(PlatformTimers, ExpireInTheOrderOfTheirLatestTimesUnlessStopped)
 {
-    ASSERT_EQ(start(1, UINT32_MAX), 0);
-    ASSERT_EQ(start(0x12345678, 60), 0);
-    ASSERT_EQ(start(2, 30), 0);
-    ASSERT_EQ(start(3, 0), 0);
-    ASSERT_EQ(start(4, 30), 0);
-    expect_expiries({3, 2, 4, 0x12345678});
+    const std::pair<uint32_t, uint32_t> starts[] = {{1, UINT32_MAX}, {0x12345678, 60}, {2, 30}, {3, 0},
+                                                    {4, 30},         {5, 20},          {6, 10}, {6, 70}};
+    for (const auto& [id, ms] : starts)
+        ASSERT_EQ(start(id, ms), 0);
+    EXPECT_EQ(stop(5), 0);
+    EXPECT_NE(stop(5), 0);
+    expect_expiries({3, 2, 4, 0x12345678, 6});
     EXPECT_NE(stop(2), 0) << "expired";
     EXPECT_EQ(stop(1), 0);
-}
-
-TEST_F(PlatformTimers, StoppedOnesAndTheOldTimeOfRestartedOnesDoNotExpire)
-{
-    ASSERT_EQ(start(1, 40), 0);
-    ASSERT_EQ(start(2, 20), 0);
-    ASSERT_EQ(start(3, 10), 0);
-    EXPECT_EQ(stop(2), 0);
-    EXPECT_NE(stop(2), 0);
-    ASSERT_EQ(start(3, 60), 0);
-    expect_expiries({1, 3});
-    Numbered message;
-    EXPECT_EQ(receive(&message, 0), 0);
 }
 
 TEST_F(PlatformTimers, TheirNumberIsBounded)

@@ -7,8 +7,7 @@ namespace {
 constexpr BtDevAddress kBen = phone(0xB0, 2);
 constexpr BtDevAddress kNobody = phone(0xC0, 3);
 constexpr uint32_t kBenLast = 0x0200; // word 4 of the address
-constexpr BtConParameters kProfile[] = {{0, {}}, {1, {}}, {2, {}}, {3, {}}, {4, {}},
-                                        {5, {}}, {6, {}}, {7, {}}, {8, {}}};
+constexpr BtConParameters kProfile0 = {0, {}}, kProfile1 = {1, {}}, kProfile7 = {7, {}}, kProfile8 = {8, {}};
 
 int32_t registered_count()
 {
@@ -32,7 +31,7 @@ int32_t connected_in_order()
     return order.num;
 }
 
-// Killed, the service comes back; what is posted meanwhile waits for it.
+// It comes back; what is posted meanwhile waits for it.
 void kill_connection_service()
 {
     ASSERT_EQ(0, kill(static_cast<pid_t>(connection_service().pid), SIGKILL));
@@ -79,13 +78,13 @@ TEST(SimConnection, SearchReportsEachPhoneThenItsEndAndCanBeCancelled)
 TEST(SimConnection, DeviceLivesFromItsPairingToItsDeletion)
 {
     in_unit("two_phones", [] {
-        ASSERT_EQ(0, BT_SRV_CON_requestConnection(&kAnna, &kProfile[0]));
+        ASSERT_EQ(0, BT_SRV_CON_requestConnection(&kAnna, &kProfile0));
         for (const uint32_t id : {EVENT(REGISTERED), EVENT(CONNECTED), EVENT(CONNECTION)})
             EXPECT_EQ(id, next_event().msg_header.hdr.cid);
         EXPECT_EQ(1, registered_count());
         EXPECT_EQ(2U, connection_mode(kAnna));
-        EXPECT_ANSWER(requestConnection(&kAnna, &kProfile[0]), CONNECTION, 0, BT_SIM_ALREADY_CONNECTED);
-        EXPECT_ANSWER(requestConnection(&kAnna, &kProfile[8]), CONNECTION, 0, BT_SIM_OK);
+        EXPECT_ANSWER(requestConnection(&kAnna, &kProfile0), CONNECTION, 0, BT_SIM_ALREADY_CONNECTED);
+        EXPECT_ANSWER(requestConnection(&kAnna, &kProfile8), CONNECTION, 0, BT_SIM_OK);
         EXPECT_EQ(1, connected_in_order());
 
         EXPECT_ANSWER(requestDisconnection(&kAnna, 0), DISCONNECTION, 0, BT_SIM_OK);
@@ -98,34 +97,28 @@ TEST(SimConnection, DeviceLivesFromItsPairingToItsDeletion)
     });
 }
 
-TEST(SimConnection, RequestsWaitForTheirTurnAndThoseThatCannotWorkSayWhy)
-{
-    in_unit("two_phones", [] {
-        EXPECT_ANSWER(requestConnection(&kNobody, &kProfile[0]), CONNECTION, 0, BT_SIM_UNKNOWN_DEVICE);
-        EXPECT_ANSWER(requestConnection(&kAnna, &kProfile[7]), CONNECTION, 0, BT_SIM_NOT_SUPPORTED);
-        EXPECT_ANSWER(requestDisconnection(&kBen, 0), DISCONNECTION, 0, BT_SIM_NOT_REGISTERED);
-        EXPECT_ANSWER(delete (&kBen), DELETE, 0, BT_SIM_NOT_REGISTERED);
-        EXPECT_ANSWER(TerminationRegistration(), TERMINATION_REGISTRATION, 0, BT_SIM_NOT_EXPECTED);
-
-        EXPECT_EQ(0, BT_SRV_CON_requestConnection(&kAnna, &kProfile[0]));
-        EXPECT_EQ(0, BT_SRV_CON_requestConnection(&kAnna, &kProfile[1]));
-        EXPECT_ANSWER(requestDisconnection(&kAnna, 0), CONNECTION, 12, 0);
-        EXPECT_EVENT(CONNECTION, 12, 1);
-        EXPECT_EVENT(DISCONNECTION, 0, BT_SIM_OK);
-    });
-}
-
-TEST(SimConnection, QueriedDeviceIdAndServicesAreThoseOfThePhone)
+TEST(SimConnection, PhonesAreQueriedAndRequestsWaitForTheirTurnOrSayWhyTheyCannotWork)
 {
     in_unit("two_phones", [] {
         EXPECT_ANSWER(queryRemoteDeviceDIDInfo(&kAnna), REMOTE_DID, 32, 0x02000100);
         uint8_t value[8] = {};
         EXPECT_EQ(0, BT_SRV_CON_getRemoteDeviceDIDInfo(&kAnna, 2, value));
         EXPECT_EQ(0, std::memcmp("\x00\x01\x00\x02\x00\x03\x00\x04", value, sizeof value));
-        for (const auto& [uuid, found] : {std::pair<uint8_t, uint32_t>{0x0A, 1}, {0x0B, 0}}) {
-            const BtConServiceId service = {{2, 0, 0, 0, 0x11, uuid}};
-            EXPECT_ANSWER(startServiceDiscovery_UUID(&kAnna, &service), SERVICE_DISCOVERY_UUID, 12, found);
-        }
+        const BtConServiceId offered = {{2, 0, 0, 0, 0x11, 0x0A}}, missing = {{2, 0, 0, 0, 0x11, 0x0B}};
+        EXPECT_ANSWER(startServiceDiscovery_UUID(&kAnna, &offered), SERVICE_DISCOVERY_UUID, 12, 1);
+        EXPECT_ANSWER(startServiceDiscovery_UUID(&kAnna, &missing), SERVICE_DISCOVERY_UUID, 12, 0);
+
+        EXPECT_ANSWER(requestConnection(&kNobody, &kProfile0), CONNECTION, 0, BT_SIM_UNKNOWN_DEVICE);
+        EXPECT_ANSWER(requestConnection(&kAnna, &kProfile7), CONNECTION, 0, BT_SIM_NOT_SUPPORTED);
+        EXPECT_ANSWER(requestDisconnection(&kBen, 0), DISCONNECTION, 0, BT_SIM_NOT_REGISTERED);
+        EXPECT_ANSWER(delete (&kBen), DELETE, 0, BT_SIM_NOT_REGISTERED);
+        EXPECT_ANSWER(TerminationRegistration(), TERMINATION_REGISTRATION, 0, BT_SIM_NOT_EXPECTED);
+
+        EXPECT_EQ(0, BT_SRV_CON_requestConnection(&kAnna, &kProfile0));
+        EXPECT_EQ(0, BT_SRV_CON_requestConnection(&kAnna, &kProfile1));
+        EXPECT_ANSWER(requestDisconnection(&kAnna, 0), CONNECTION, 12, 0);
+        EXPECT_EVENT(CONNECTION, 12, 1);
+        EXPECT_EVENT(DISCONNECTION, 0, BT_SIM_OK);
     });
 }
 
@@ -134,11 +127,11 @@ TEST(SimConnection, PinDecidesAboutPairing)
     in_unit("two_phones", [] {
         const BtConPinCode wrong = {{4, 0, 0, 0, '9', '9', '9', '9'}};
         const BtConPinCode right = {{4, 0, 0, 0, '1', '2', '3', '4'}};
-        EXPECT_ANSWER(requestConnection(&kBen, &kProfile[0]), PIN_REQUEST, 4, kBenLast);
+        EXPECT_ANSWER(requestConnection(&kBen, &kProfile0), PIN_REQUEST, 4, kBenLast);
         EXPECT_ANSWER(authenticatePinCode(0, &kBen, &wrong), AUTHENTICATE_PIN, 0, BT_SIM_AUTHENTICATION_FAILED);
         EXPECT_EVENT(CONNECTION, 0, BT_SIM_AUTHENTICATION_FAILED);
         EXPECT_EQ(0, registered_count());
-        EXPECT_ANSWER(requestConnection(&kBen, &kProfile[0]), PIN_REQUEST, 4, kBenLast);
+        EXPECT_ANSWER(requestConnection(&kBen, &kProfile0), PIN_REQUEST, 4, kBenLast);
         EXPECT_ANSWER(authenticatePinCode(0, &kBen, &right), CONNECTION, 0, BT_SIM_OK);
         EXPECT_ANSWER(authenticatePinCode(0, &kBen, &right), AUTHENTICATE_PIN, 0, BT_SIM_NOT_EXPECTED);
     });
@@ -146,19 +139,14 @@ TEST(SimConnection, PinDecidesAboutPairing)
 
 TEST(SimPairing, EachPhoneIsPairedInItsOwnWay)
 {
-    constexpr uint32_t kAgree = 0;
-    constexpr uint32_t kRefuse = 1;
     in_unit("pairing", [] {
-        const BtConPasskey right = {{'3', '1', '4', '1', '5', '9'}};
-        const BtConPasskey wrong = {{'3', '1', '4', '1', '5'}};
+        constexpr uint32_t kAgree = 0, kRefuse = 1;
+        const BtConPasskey right = {{'3', '1', '4', '1', '5', '9'}}, wrong = {{'3', '1', '4', '1', '5'}};
         const BtDevAddress two = phone(0xA0, 2), three = phone(0xA0, 3), four = phone(0xA0, 4);
-        const auto ask = [](const BtDevAddress& address) {
-            return BT_SRV_CON_requestConnection(&address, &kProfile[0]);
+        const auto prompt_one = [] {
+            EXPECT_ANSWER(requestConnection(&kAnna, &kProfile0), NUMERIC_REQUEST, 4, 0x0100);
         };
-        const auto prompt_one = [&] {
-            EXPECT_EQ(0, ask(kAnna));
-            EXPECT_EVENT(NUMERIC_REQUEST, 4, 0x0100);
-        };
+        const auto prompt_two = [&] { EXPECT_ANSWER(requestConnection(&two, &kProfile0), PASSKEY_REQUEST, 4, 0x0200); };
         prompt_one();
         EXPECT_ANSWER(authenticateNumericValue(kRefuse, &kAnna), CONNECTION, 0, BT_SIM_REFUSED);
         prompt_one();
@@ -172,14 +160,12 @@ TEST(SimPairing, EachPhoneIsPairedInItsOwnWay)
         EXPECT_EQ(0, BT_SRV_CON_authenticatePasskey(kAgree, &kAnna, &right)) << "answers another prompt";
         EXPECT_ANSWER(authenticateNumericValue(kAgree, &kAnna), CONNECTION, 0, BT_SIM_OK);
 
-        EXPECT_EQ(0, ask(two));
-        EXPECT_EVENT(PASSKEY_REQUEST, 4, 0x0200);
+        prompt_two();
         EXPECT_ANSWER(authenticatePasskey(kAgree, &two, &wrong), CONNECTION, 0, BT_SIM_AUTHENTICATION_FAILED);
-        EXPECT_EQ(0, ask(two));
-        EXPECT_EVENT(PASSKEY_REQUEST, 4, 0x0200);
+        prompt_two();
         EXPECT_ANSWER(authenticatePasskey(kAgree, &two, &right), CONNECTION, 0, BT_SIM_OK);
-        EXPECT_ANSWER(requestConnection(&three, &kProfile[0]), CONNECTION, 0, BT_SIM_REFUSED);
-        EXPECT_ANSWER(requestConnection(&four, &kProfile[0]), CONNECTION, 0, BT_SIM_OUT_OF_RANGE);
+        EXPECT_ANSWER(requestConnection(&three, &kProfile0), CONNECTION, 0, BT_SIM_REFUSED);
+        EXPECT_ANSWER(requestConnection(&four, &kProfile0), CONNECTION, 0, BT_SIM_OUT_OF_RANGE);
         EXPECT_EQ(2, registered_count());
     });
 }
@@ -205,14 +191,14 @@ TEST(SimPairing, PhoneThatAsksIsConnectedOnlyWhenTheApplicationAccepts)
 TEST(SimConnection, KilledServiceComesBackWithItsDevicesAndWithoutConnections)
 {
     in_unit("two_phones", [] {
-        EXPECT_ANSWER(requestConnection(&kAnna, &kProfile[0]), CONNECTION, 0, BT_SIM_OK);
+        EXPECT_ANSWER(requestConnection(&kAnna, &kProfile0), CONNECTION, 0, BT_SIM_OK);
         for (uint32_t starts = 2; starts < 5; ++starts) {
             kill_connection_service();
             EXPECT_ANSWER(requestDisconnection(&kAnna, 0), DISCONNECTION, 0, BT_SIM_NOT_CONNECTED);
             EXPECT_EQ(starts, connection_service().starts);
             EXPECT_EQ(1, registered_count());
             EXPECT_EQ(0U, connection_mode(kAnna));
-            EXPECT_ANSWER(requestConnection(&kAnna, &kProfile[0]), CONNECTION, 0, BT_SIM_OK) << "events still arrive";
+            EXPECT_ANSWER(requestConnection(&kAnna, &kProfile0), CONNECTION, 0, BT_SIM_OK) << "events still arrive";
         }
     });
 }
@@ -244,7 +230,7 @@ TEST(SimConnection, MessagesOfAnyLengthAreAnsweredOrDroppedAndHarmNothing)
                 post_raw(id, length);
         for (size_t i = 0; i < std::size(lengths); ++i)
             EXPECT_EVENT(CONNECTION, 0, BT_SIM_MALFORMED);
-        EXPECT_ANSWER(requestConnection(&kAnna, &kProfile[0]), CONNECTION, 0, BT_SIM_OK);
+        EXPECT_ANSWER(requestConnection(&kAnna, &kProfile0), CONNECTION, 0, BT_SIM_OK);
         EXPECT_EQ(1U, connection_service().starts) << "the service ended on one of the messages";
     });
 }

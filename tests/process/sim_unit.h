@@ -9,11 +9,11 @@
 #include <bt_service/bt_service.h>
 #include <bt_sim/events.h>
 
-#include <fcntl.h>
-
+#include <algorithm>
 #include <cstring>
 #include <filesystem>
 #include <string>
+#include <tuple>
 #include <vector>
 
 namespace bt::test {
@@ -23,15 +23,20 @@ struct Ended {
     std::string out, err;
 };
 
+[[noreturn]] inline void become(const std::string& command)
+{
+    execl("/bin/sh", "sh", "-c", ("exec " + command).c_str(), nullptr);
+    std::_Exit(126);
+}
+
 // A program whose output is kept.
 class Program {
 public:
-    Program(const char* path, std::vector<std::string> words, bool closed_output = false)
+    explicit Program(const std::string& command)
         : process_([&] {
               out_.take(STDOUT_FILENO);
               err_.take(STDERR_FILENO);
-              if (closed_output) close(STDOUT_FILENO);
-              become(path, words);
+              become(command);
           })
     {
     }
@@ -39,16 +44,6 @@ public:
     {
         const int code = process_.end(signal);
         return {code, out_.text(), err_.text()};
-    }
-
-    [[noreturn]] static void become(const char* path, std::vector<std::string> words)
-    {
-        std::vector<char*> arguments{const_cast<char*>(path)};
-        for (std::string& word : words)
-            arguments.push_back(word.data());
-        arguments.push_back(nullptr);
-        execv(path, arguments.data());
-        _exit(126);
     }
 
 private:
@@ -60,9 +55,9 @@ private:
 struct Unit {
     explicit Unit(const std::string& name, const std::string& scenario = "two_phones")
         : domain(name + "-" + std::to_string(getpid())), process([&] {
-              fcntl(line_to_parent, F_SETFD, 0);
-              Program::become(BTSVC_SIM_PATH, {"--scenario", BTSVC_SCENARIOS + scenario + ".json", "--domain", domain,
-                                               "--root", root, "--ready-fd", std::to_string(line_to_parent)});
+              dup2(line_to_parent, 99);
+              become("'" BTSVC_SIM_PATH "' --scenario '" BTSVC_SCENARIOS + scenario + ".json' --domain " + domain +
+                     " --root " + root + " --ready-fd 99");
           })
     {
     }
@@ -73,7 +68,7 @@ struct Unit {
     }
 
     const std::string domain;
-    std::string root = std::filesystem::temp_directory_path() / "btsim-test-XXXXXX";
+    std::string root = testing::TempDir() + "btsim-test-XXXXXX";
     const bool has_root = mkdtemp(root.data()) != nullptr;
     Child process;
     const bool ready = hear(process.line); // or has ended

@@ -158,7 +158,7 @@ TEST(SimScenario, WrongFileIsRefusedWithPlaceAndRemedy)
     const std::string file = testing::TempDir() + "scenario-" + std::to_string(getpid()) + ".json";
     for (const auto& [text, complaint] : rows) {
         std::ofstream(file) << text;
-        const Ended check = Program(BTSVC_SIM_PATH, {"--check", "--scenario", file}).end();
+        const Ended check = Program("'" BTSVC_SIM_PATH "' --check --scenario " + file).end();
         EXPECT_EQ(2, check.code) << text;
         EXPECT_TRUE(std::regex_search(check.err, std::regex(file + ": .*" + complaint))) << text << "\n" << check.err;
     }
