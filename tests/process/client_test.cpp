@@ -88,7 +88,9 @@ protected:
     // Every line must be one JSON object of this version; those of the type are returned.
     std::vector<json> run_json(const std::string& line, const std::string& type) const
     {
-        std::istringstream lines(run("--json " + line).out);
+        const Ended done = run("--json " + line);
+        EXPECT_EQ(done.code, 0) << done.err;
+        std::istringstream lines(done.out);
         std::vector<json> objects;
         for (std::string text; std::getline(lines, text);) {
             const json object = json::parse(text, nullptr, false);
@@ -104,10 +106,9 @@ protected:
     void scribble(const char* name, void (*change)(uint8_t* bytes, uint32_t size)) const
     {
         as_application(unit.domain, [name, change] {
-            void* address = nullptr;
             uint32_t size = 0;
-            ASSERT_EQ(0, _sys_LinkShareData(name, &address, &size));
-            change(static_cast<uint8_t*>(address), size);
+            auto* const bytes = static_cast<uint8_t*>(link_data(name, &size));
+            change(bytes, size);
         });
     }
 

@@ -97,11 +97,4 @@ inline BtHostLock first_lock()
     return lock;
 }
 
-inline void* link_data(const char* data, uint32_t* size = nullptr)
-{
-    void* address = nullptr;
-    EXPECT_EQ(_sys_LinkShareData(data, &address, size), 0) << bt_host_error();
-    return address;
-}
-
 } // namespace bt::test

@@ -4,6 +4,7 @@
 #include <bt_service/bt_log.h>
 
 #include <array>
+#include <atomic>
 #include <regex>
 #include <sstream>
 #include <thread>
@@ -23,8 +24,9 @@ std::string stderr_of(const char* output, const std::function<void()>& body, int
         if (output != nullptr) setenv("BT_PLATFORM_LOG", output, 1);
         body();
     });
+    const std::string text = errors.text();
     EXPECT_EQ(child.end(), exit_code);
-    return errors.text();
+    return text;
 }
 
 void log_some()
@@ -63,11 +65,14 @@ TEST_F(PlatformLogger, ZonesAreKeptInTheLibrarysBlock)
 
 TEST_F(PlatformLogger, LinesOfThreadsDoNotMixAndLongOnesAreCut)
 {
-    constexpr int kLines = 300;
+    constexpr int kLines = 1000;
     std::istringstream lines(stderr_of("stderr", [] {
         std::thread threads[4];
+        std::atomic<int> running{0};
         for (size_t at = 0; at < 4; ++at) {
-            threads[at] = std::thread([body = std::string(400 + 300 * at, static_cast<char>('a' + at))] {
+            threads[at] = std::thread([&running, body = std::string(400 + 300 * at, static_cast<char>('a' + at))] {
+                for (++running; running < 4;)
+                    sched_yield();
                 for (int line = 0; line < kLines; ++line)
                     ZelLog(1, line, "f", "<%s", body.c_str());
             });

@@ -89,9 +89,9 @@ TEST_F(PlatformObjects, ForeignAndCutOnesAreRefusedByNameWithTheReason)
         {"layout version 2", [](const Raw& o) { o.stamp().version = 2; }},
         {"made by a 16-bit program", [](const Raw& o) { o.stamp().word_size = 2; }},
         {"stamped with", [](const Raw& o) { ++o.stamp().size; }},
-        {"has 1 bytes|impossible size, 1 bytes", [](const Raw& o) { EXPECT_EQ(ftruncate(o.fd, 1), 0); }},
-        {"has 63 bytes|impossible size, 63 bytes", [](const Raw& o) { EXPECT_EQ(ftruncate(o.fd, 63), 0); }},
-        {"has 65 bytes|has 65", [](const Raw& o) { EXPECT_EQ(ftruncate(o.fd, 65), 0); }},
+        {" 1 bytes", [](const Raw& o) { EXPECT_EQ(ftruncate(o.fd, 1), 0); }},
+        {" 63 bytes", [](const Raw& o) { EXPECT_EQ(ftruncate(o.fd, 63), 0); }},
+        {"has 65", [](const Raw& o) { EXPECT_EQ(ftruncate(o.fd, 65), 0); }},
     };
     for (const std::string& object : {domain, queue, data}) {
         for (const auto& [reason, spoil] : rows) {
@@ -101,7 +101,7 @@ TEST_F(PlatformObjects, ForeignAndCutOnesAreRefusedByNameWithTheReason)
             EXPECT_TRUE(in_child([&, reason = reason] {
                 void* address = nullptr;
                 EXPECT_EQ(object == data ? _sys_LinkShareData("/tmp/D", &address, nullptr) : post(Numbered()), -1);
-                EXPECT_THAT(bt_host_error(), testing::ContainsRegex(object + " .*(" + reason + ").*; "));
+                EXPECT_THAT(bt_host_error(), testing::ContainsRegex(object + ".*" + reason + ".*; "));
             })) << reason;
             raw.mend();
             EXPECT_TRUE(use_gives(0, 0)) << reason;

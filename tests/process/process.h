@@ -1,8 +1,11 @@
 // Processes that tests start, talk to and kill.
 #pragma once
 
+#include <bt_platform/host.h>
 #include <gtest/gtest.h>
 
+#include <fcntl.h>
+#include <sys/prctl.h>
 #include <sys/socket.h>
 #include <sys/wait.h>
 #include <unistd.h>
@@ -51,6 +54,7 @@ public:
         pid = fork();
         close(ends[pid == 0 ? 0 : 1]);
         if (pid != 0) return;
+        prctl(PR_SET_PDEATHSIG, SIGKILL);
         line_to_parent = ends[1];
         body();
         std::fflush(nullptr);
@@ -86,21 +90,37 @@ inline bool in_child(const std::function<void()>& body)
     return Child(body).end() == 0;
 }
 
-// A file in the place of a child's output stream.
+inline void* link_data(const char* data, uint32_t* size = nullptr)
+{
+    void* address = nullptr;
+    EXPECT_EQ(_sys_LinkShareData(data, &address, size), 0) << bt_host_error();
+    return address;
+}
+
+// A child's output stream.
 class Capture {
 public:
-    ~Capture() { std::fclose(file_); }
-
-    void take(int stream) { dup2(fileno(file_), stream); }
-    std::string text() const
+    Capture()
     {
-        std::string all(static_cast<size_t>(lseek(fileno(file_), 0, SEEK_END)), '\0');
-        EXPECT_EQ(pread(fileno(file_), all.data(), all.size(), 0), static_cast<ssize_t>(all.size()));
+        if (pipe2(ends_, O_CLOEXEC) != 0) std::abort();
+    }
+    ~Capture() { close(ends_[0]); }
+
+    void take(int stream) { dup2(ends_[1], stream); }
+
+    // What the child writes until its end.
+    std::string text()
+    {
+        close(ends_[1]);
+        std::string all;
+        char part[4096];
+        for (ssize_t got = 0; (got = read(ends_[0], part, sizeof part)) > 0;)
+            all.append(part, static_cast<size_t>(got));
         return all;
     }
 
 private:
-    std::FILE* const file_ = std::tmpfile();
+    int ends_[2];
 };
 
 } // namespace bt::test

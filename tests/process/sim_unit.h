@@ -19,8 +19,8 @@
 namespace bt::test {
 
 struct Ended {
-    int code;
     std::string out, err;
+    int code;
 };
 
 [[noreturn]] inline void become(const std::string& command)
@@ -42,8 +42,8 @@ public:
     }
     Ended end(int signal = 0)
     {
-        const int code = process_.end(signal);
-        return {code, out_.text(), err_.text()};
+        kill(process_.pid, signal);
+        return {out_.text(), err_.text(), process_.end()};
     }
 
 private:
@@ -130,19 +130,9 @@ constexpr BtDevAddress phone(uint8_t first, uint8_t last)
 }
 constexpr BtDevAddress kAnna = phone(0xA0, 1);
 
-// A record that the unit keeps about itself.
-template <class Record>
-const Record& record_of_unit(const char* name)
-{
-    void* address = nullptr;
-    uint32_t size = sizeof(Record);
-    EXPECT_EQ(0, _sys_LinkShareData(name, &address, &size)) << bt_host_error();
-    return *static_cast<const Record*>(address);
-}
-
 inline const BtSimService& connection_service()
 {
-    const auto& services = record_of_unit<BtSimUnit>(kUnitDataName).services;
+    const auto& services = static_cast<const BtSimUnit*>(link_data(kUnitDataName))->services;
     return *std::find_if(std::begin(services), std::end(services), [](auto& s) { return s.pno == PNO_BT_CON; });
 }
 

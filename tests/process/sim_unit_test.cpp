@@ -10,20 +10,18 @@ namespace bt::test {
 namespace {
 
 constexpr uint32_t kCancelled = BT_SIM_EVENT_CON_CANCEL_SEARCH;
-constexpr uint32_t kDisconnected = BT_SIM_EVENT_CON_ALL_DISCONNECTION;
 
 void expect_service_works()
 {
-    listen_for({kDisconnected});
+    listen_for({BT_SIM_EVENT_CON_ALL_DISCONNECTION});
     EXPECT_ANSWER(requestAllDisconnection(1, &kAnna), ALL_DISCONNECTION, 0, BT_SIM_OK);
 }
 
-std::vector<std::string> objects_of(const std::string& domain)
+bool has_objects(const std::string& domain)
 {
-    std::vector<std::string> names;
-    for (const auto& entry : std::filesystem::directory_iterator("/dev/shm"))
-        if (entry.path().string().find(domain) != std::string::npos) names.push_back(entry.path());
-    return names;
+    const std::filesystem::directory_iterator all("/dev/shm");
+    return std::any_of(begin(all), end(all),
+                       [&](auto& entry) { return entry.path().string().find(domain) != std::string::npos; });
 }
 
 TEST(SimUnit, UnitsInTwoDomainsDoNotSeeEachOtherAndLeaveNothingInSharedMemory)
@@ -36,19 +34,15 @@ TEST(SimUnit, UnitsInTwoDomainsDoNotSeeEachOtherAndLeaveNothingInSharedMemory)
         listen_for({BT_SIM_EVENT_CON_CONNECTION});
         EXPECT_ANSWER(requestConnection(&kAnna, &parameters), CONNECTION, 0, BT_SIM_OK);
     });
-    const auto expect_registered = [](const Unit& unit, int32_t result) {
-        as_application(unit.domain, [result] {
+    for (auto& [unit, registered, signal] : {std::tuple<Unit&, int32_t, int>{a, 0, SIGTERM}, {b, -1, SIGINT}}) {
+        as_application(unit.domain, [registered = registered] {
             uint32_t mode = 0;
-            EXPECT_EQ(result, BT_SRV_CON_getConnectionMode(&kAnna, &mode));
+            EXPECT_EQ(registered, BT_SRV_CON_getConnectionMode(&kAnna, &mode));
+            expect_service_works();
         });
-    };
-    expect_registered(a, 0);
-    expect_registered(b, -1);
-    for (auto& [unit, signal] : {std::pair<Unit&, int>{a, SIGTERM}, {b, SIGINT}}) {
-        as_application(unit.domain, expect_service_works);
-        EXPECT_THAT(objects_of(unit.domain), testing::Not(testing::IsEmpty()));
+        EXPECT_TRUE(has_objects(unit.domain));
         EXPECT_EQ(0, unit.process.end(signal));
-        EXPECT_THAT(objects_of(unit.domain), testing::IsEmpty());
+        EXPECT_FALSE(has_objects(unit.domain));
     }
 }
 
@@ -75,32 +69,9 @@ TEST(SimUnit, DomainIsTakenOverFromADeadUnitOnlyAndItsApplicationsGoOn)
     EXPECT_EQ(application.end(), 0);
 }
 
-TEST(SimUnit, SuspendedListenerGetsNothingUntilItIsResumed)
-{
-    const Unit unit("sim-suspend");
-    ASSERT_TRUE(unit.ready);
-    as_application(unit.domain, [] {
-        const uint32_t searches = listen_for({kCancelled});
-        listen_for({kDisconnected});
-        BT_SRV_EvtSrv_suspend(searches);
-        ASSERT_EQ(0, BT_SRV_CON_cancelSearch());
-        ASSERT_EQ(0, BT_SRV_CON_requestAllDisconnection(1, &kAnna));
-        EXPECT_EQ(kDisconnected, next_event().msg_header.hdr.cid);
-        BT_SRV_EvtSrv_resume(searches);
-        ASSERT_EQ(0, BT_SRV_CON_cancelSearch());
-        EXPECT_EQ(kCancelled, next_event().msg_header.hdr.cid);
-    });
-}
-
-const BtSimListenerCount& count_of(uint32_t handle)
-{
-    const auto& counts = record_of_unit<BtSimDistributor>(kDistributorDataName).listeners;
-    return *std::find_if(std::begin(counts), std::end(counts) - 1, [=](auto& count) { return count.handle == handle; });
-}
-
-// One listener never takes its events, one does not exist, one would hand every event back: those who listen behind
-// them in the table miss none.
-TEST(SimUnit, BrokenListenersDelayNobody)
+// One listener never takes its events, one does not exist, one would hand every event back, one is suspended: those who
+// listen behind them in the table miss none.
+TEST(SimUnit, BrokenAndSuspendedListenersDelayNobody)
 {
     const Unit unit("sim-broken");
     ASSERT_TRUE(unit.ready);
@@ -112,18 +83,25 @@ TEST(SimUnit, BrokenListenersDelayNobody)
     });
     hear(lazy.line);
     as_application(unit.domain, [] {
-        const auto& first = record_of_unit<BtSimDistributor>(kDistributorDataName).listeners[0];
         const uint32_t gone = BT_SRV_EvtSrv_regist(0x7777, 0, 1, &kCancelled);
-        const uint32_t circle = BT_SRV_EvtSrv_regist(PNO_BT_EDS, 0, 1, &kCancelled);
-        const uint32_t mine = listen_for({kCancelled});
-        while (first.full < 20) {
+        BT_SRV_EvtSrv_regist(PNO_BT_EDS, 0, 1, &kCancelled);
+        const uint32_t suspended = listen_for({kCancelled});
+        BT_SRV_EvtSrv_suspend(suspended);
+        listen_for({kCancelled});
+        const auto& counts = static_cast<const BtSimDistributor*>(link_data(kDistributorDataName))->listeners;
+        while (counts[0].full < 20) {
             ASSERT_EQ(0, BT_SRV_CON_cancelSearch());
             ASSERT_EQ(kCancelled, next_event().msg_header.hdr.cid);
         }
-        EXPECT_EQ(0U, count_of(mine).full + count_of(mine).failed + count_of(mine).gone);
-        EXPECT_EQ(0U, count_of(circle).delivered);
+        EXPECT_EQ(counts[4].pno, _sys_GetPno());
+        EXPECT_EQ(counts[4].full + counts[4].failed + counts[4].gone, 0U);
+        EXPECT_EQ(counts[2].delivered + counts[3].delivered, 0U);
         EXPECT_EQ(nullptr, find_HdlList(gone)) << "nobody owns its number, so it loses its registration";
-        EXPECT_NE(nullptr, find_HdlList(first.handle)) << "its process lives";
+        EXPECT_NE(nullptr, find_HdlList(counts[0].handle)) << "its process lives";
+        BT_SRV_EvtSrv_resume(suspended);
+        ASSERT_EQ(0, BT_SRV_CON_cancelSearch());
+        for (int registrations = 2; registrations > 0; --registrations)
+            EXPECT_EQ(kCancelled, next_event().msg_header.hdr.cid);
     });
     say(lazy.line);
     EXPECT_EQ(lazy.end(), 0);
