@@ -48,6 +48,7 @@ TEST(Client, RefusesCommandLinesThatMakeNoSenseAndUnitsThatAreNotThere)
         {"call CON_search 12x", 2, "\"12x\""},
         {"call CON_delete 11:22:33:44:55", 2, "AA:BB:CC:DD:EE:FF"},
         {"call CON_delete 11:22:33:44:55:6G", 2, "AA:BB:CC:DD:EE:FF"},
+        {"call CON_delete 112233445566", 2, "AA:BB:CC:DD:EE:FF"},
         {"call CON_authenticatePasskey 0 A0:00:00:00:00:01 010203040506070809", 2, "at most 8"},
         {"call CON_authenticatePasskey 0 A0:00:00:00:00:01 123", 2, "pairs"},
         {"call CON_requestConnection A0:00:00:00:00:01 0,1,2,3,4,5,6,7", 2, "at most 7"},
