@@ -1,4 +1,4 @@
-# 32-bit x86 by Debian's cross compiler; the programs run under user-mode emulation, so that the kernel need not run them.
+# 32-bit x86 by Debian's cross compiler. Where the kernel runs 32-bit programs they run by themselves, else emulated.
 set(CMAKE_SYSTEM_NAME Linux)
 set(CMAKE_SYSTEM_PROCESSOR i686)
 set(CMAKE_C_COMPILER i686-linux-gnu-gcc)
@@ -6,4 +6,11 @@ set(CMAKE_CXX_COMPILER i686-linux-gnu-g++)
 set(CMAKE_FIND_ROOT_PATH /usr/i686-linux-gnu)
 set(CMAKE_FIND_ROOT_PATH_MODE_LIBRARY ONLY)
 set(CMAKE_FIND_ROOT_PATH_MODE_INCLUDE ONLY)
-set(CMAKE_CROSSCOMPILING_EMULATOR qemu-i386 -L /usr/i686-linux-gnu)
+
+set(i686_loader /usr/i686-linux-gnu/lib/ld-linux.so.2)
+execute_process(COMMAND ${i686_loader} --version OUTPUT_QUIET ERROR_QUIET RESULT_VARIABLE i686_result)
+if(i686_result EQUAL 0)
+  set(CMAKE_CROSSCOMPILING_EMULATOR ${i686_loader} --library-path /usr/i686-linux-gnu/lib)
+else()
+  set(CMAKE_CROSSCOMPILING_EMULATOR qemu-i386 -L /usr/i686-linux-gnu)
+endif()

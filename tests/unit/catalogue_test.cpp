@@ -107,7 +107,7 @@ TEST(CatalogueDecode, AnyBytesGiveWholeOutputWithNothingLost)
             ids.push_back(row.id);
 
     for (const uint16_t id : ids)
-        for (const size_t size : {0, 1, 5, 16, 29, 300, 1008}) {
+        for (const size_t size : {0u, 1u, 5u, 16u, 29u, 300u, 1008u}) {
             std::vector<uint8_t> payload(size);
             for (uint8_t& byte : payload)
                 byte = static_cast<uint8_t>(random() % 3 ? random() : 0xFF);

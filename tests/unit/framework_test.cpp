@@ -156,8 +156,10 @@ TEST_F(SharedMemory, ObjectLivesUntilItIsDestroyed)
     ASSERT_EQ(fstat(again.fd, &status), 0);
     EXPECT_EQ(status.st_size, 5000);
     EXPECT_EQ(std::memcmp(again.addr, "kept", 4), 0);
+    void* const mapped = again.addr;
     expect_lines("BT_CMN_destroyShm", again, BT_CMN_destroyShm);
     EXPECT_EQ(again.addr, nullptr);
+    EXPECT_EQ(msync(mapped, 5000, MS_ASYNC), -1) << "no longer mapped";
     EXPECT_FALSE(exists());
 }
 

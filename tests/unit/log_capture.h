@@ -54,6 +54,7 @@ inline const char* const kLogFile = "/tmp/bt_cmn.log";
 
 struct Outputs {
     std::string console, file;
+    size_t unflushed; // bytes of the file
 };
 
 // What `body` writes to standard output and appends to the log file.
@@ -62,7 +63,9 @@ inline Outputs outputs_of(const std::function<void()>& body)
     const size_t before = fake::read_file(kLogFile).value_or(fake::Bytes()).size();
     testing::internal::CaptureStdout();
     body();
+    const size_t flushed = fake::read_file(kLogFile).value_or(fake::Bytes()).size();
     std::fflush(nullptr);
     const fake::Bytes file = fake::read_file(kLogFile).value_or(fake::Bytes());
-    return {testing::internal::GetCapturedStdout(), std::string(file.begin(), file.end()).substr(before)};
+    return {testing::internal::GetCapturedStdout(), std::string(file.begin(), file.end()).substr(before),
+            file.size() - flushed};
 }

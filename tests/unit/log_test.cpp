@@ -19,13 +19,18 @@ void write_switches(const char* path, const std::string& switches)
     fake::write_file(path, Bytes(switches.begin(), switches.end()));
 }
 
-// Expects the text behind a time stamp, or nothing at all for no text.
+// Expects the text behind the present time, or nothing at all for no text.
 void expect_record(const std::string& got, const std::string& text)
 {
     static const std::regex stamp(R"([ 0-9]{4}/\d\d/\d\d \d\d:\d\d:\d\d\.\d{3} )");
     const std::string time = got.substr(0, 24);
     EXPECT_EQ(got.substr(time.size()), text);
-    EXPECT_TRUE(text.empty() ? got.empty() : std::regex_match(time, stamp)) << got;
+    if (text.empty()) return;
+    EXPECT_TRUE(std::regex_match(time, stamp)) << got;
+    std::tm at{};
+    at.tm_isdst = -1;
+    strptime(time.c_str(), "%Y/%m/%d %H:%M:%S", &at);
+    EXPECT_NEAR(std::mktime(&at), std::time(nullptr), 60) << got;
 }
 
 std::vector<std::string> zel(int64_t level)
@@ -85,7 +90,7 @@ TEST_F(Log, SwitchFileLinesSelectTheFlags)
         {"@ConsoleLog= ON;\n", "0010"},
         {"@ConsoleLogs=ON;\n", "0010"},
         {"@ConsoleSRVLog=OFF;\n", "0010"},
-        {"@ConsoleLog=OFF;\n@ConsoleLog=ON;\n@FileOutLog=ON;\n@StrmLog=ON;\n", "1111"},
+        {"@ConsoleLog=OFF;\n@ConsoleLog=ON;\n@FileOutLog=ON;\n@ConsoleSRVLog=ON;\n@StrmLog=ON;\n", "1111"},
         {"", "0010"}, // a selection starts from the defaults
         {"@ConsoleLog=ON;\n@ConsoleLog=OFF;\n", "1010"},
         {"@ConsoleLog=ON; with a remark\n", "1010"},
@@ -167,6 +172,7 @@ TEST_F(Log, RecordsEndInOneNewlineUnlessTheFormatHasIt)
         expect_record(both.file, row.file);
         EXPECT_EQ(both.console.substr(0, 24), both.file.substr(0, 24)) << "one timestamp for both";
         EXPECT_EQ(console.file + file.console + stub.console + stub.file, "");
+        EXPECT_EQ(file.unflushed + both.unflushed, 0u);
     }
 }
 
@@ -227,6 +233,7 @@ TEST_F(Log, DumpShowsSixteenBytesALine)
         for (const std::string& line : zel(4))
             body += line;
         expect_record(outputs.file, header + body);
+        EXPECT_EQ(outputs.unflushed, 0u);
         EXPECT_EQ(zel(4).size(), row.lines);
         EXPECT_EQ(zel(4).front(), row.first);
         EXPECT_EQ(zel(4).back(), row.last);

@@ -35,7 +35,7 @@ void put_word(uint8_t* at, uint32_t value)
 template <class T>
 T* guarded_record()
 {
-    return reinterpret_cast<T*>(fake::guarded(sizeof(T)));
+    return static_cast<T*>(static_cast<void*>(fake::guarded(sizeof(T))));
 }
 
 // Each way in which an area is not there, or is shorter than `needed`; nothing may be written then.
@@ -341,7 +341,9 @@ TEST_F(SharedResults, InstancesAreCopiedWithTheirNames)
     shm_unlink("BT_SRV_MAP_SERVICE_INFO");
 }
 
-TEST_F(SharedResults, InstancesMakeAnObjectButDoNotNeedIt)
+using SharedResultsDeathTest = SharedResults;
+
+TEST_F(SharedResultsDeathTest, InstancesMakeAnObjectButDoNotNeedIt)
 {
     const char* const name = "BT_SRV_MAP_SERVICE_INFO";
     fake::reset();

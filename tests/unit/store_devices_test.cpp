@@ -104,7 +104,7 @@ TEST(StoreDevices, AddUpdateAndRemove)
     for (Row& row : rows)
         if (row.result == -2) row.locking = Locking::kNone;
     for (unsigned i = 0; i < 8; ++i)
-        rows.push_back(add("B", 1u << i, ab, added(ab, 1, 1u << i)));
+        rows.push_back(add(i % 2 == 0 ? "A" : "B", 1u << i, ab, added(ab, i % 2, 1u << i)));
     run_rows({kDevices, 17344, none, {{kDevices, 17}}}, rows);
 }
 

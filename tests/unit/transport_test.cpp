@@ -79,7 +79,9 @@ TEST_F(Transport, SizeHandedOverIsLengthPlusHeaderButNeverMoreThanASlot)
     }
 }
 
-TEST_F(Transport, MinusOneEndsTheProcessAndNullIsRefused)
+using TransportDeathTest = Transport;
+
+TEST_F(TransportDeathTest, MinusOneEndsTheProcessAndNullIsRefused)
 {
     BtMessage message = message_of(1, 0);
     fake::answer_send(-1);
