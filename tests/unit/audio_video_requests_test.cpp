@@ -29,7 +29,7 @@ TEST_F(AudioVideoRequests, PostTheirPayload)
     POSTS(BT_SRV_AVP_setBTAAudio, 0x100F, "80", 0x80);
     POSTS(BT_SRV_AVP_getSupportInfo, 0x1010, "");
     POSTS(BT_SRV_AVP_setRandom, 0x1011, "040302F1", 0xF1020304);
-    POSTS(BT_SRV_AVP_setEq, 0x1012, "FFFFFFFF", 0xFFFFFFFF);
+    POSTS(BT_SRV_AVP_setEq, 0x1012, "FEFFFFFF", 0xFFFFFFFE);
     POSTS(BT_SRV_AVP_setRepeat, 0x1013, "00000001", 0x01000000);
     POSTS(BT_SRV_AVP_setScan, 0x1014, "00010000", 0x100);
     POSTS(BT_SRV_AVP_getPlayerApplicationValue, 0x1015, "01000000", 1);

@@ -82,6 +82,8 @@ TEST(NoHeap, StoreFrameworkAndEvents)
           call(bt_con_getallConnectOrder, memory, 1), call(bt_con_addSearchdevlist, memory),
           call(bt_con_delSearchdevlist), call(bt_con_setSettingStatusVtype, 7, 1),
           call(BT_SRV_CON_getConnectionMode, address, memory), call(BT_SRV_CON_getRemoteDeviceInfo, address, memory),
+          call(BT_SRV_CON_getLocalDeviceRole, address, memory),
+          call(BT_SRV_CON_getRemoteDeviceList, 7, address, -1, memory),
           call(bt_con_IsCheckRegDevSupportProfile, memory, 1), call(BT_SRV_CON_getScanMode, memory)})
         EXPECT_EQ(store(), 0);
     g_bt_con_share = {}; // its area is gone

@@ -4,6 +4,7 @@
 #include "catalogue/decode.h"
 #include "fake_platform.h"
 
+#include <bt_service/bt_log.h>
 #include <gtest/gtest.h>
 
 #include <algorithm>
@@ -26,11 +27,18 @@ uint32_t heap_calls_of(const std::function<void()>& body);
 
 inline bool opens_files = false; // what the rows call, which takes heap
 
+inline void refuse_log(const char*, const char* format, ...)
+{
+    ADD_FAILURE() << format;
+}
+
 template <class Body>
-int32_t without_heap(const Body& body)
+int32_t without_heap_or_log(const Body& body)
 {
     int32_t result = 0;
+    BT_CMN_logout_wrapperFunc = refuse_log;
     EXPECT_TRUE(heap_calls_of([&] { result = body(); }) == 0 || opens_files);
+    BT_CMN_logout_wrapperFunc = _BT_CMN_logout_Stub;
     return result;
 }
 
@@ -82,7 +90,7 @@ Call call(int32_t (*function)(Parameters...), Arguments... arguments)
 {
     return [=] {
         const std::tuple<Parameters...> parameters{as<Parameters>(arguments)...};
-        return without_heap([&] { return std::apply(function, parameters); });
+        return without_heap_or_log([&] { return std::apply(function, parameters); });
     };
 }
 
@@ -180,7 +188,7 @@ private:
 inline fake::Bytes output_of(uint32_t size, const std::function<int32_t(void*)>& query, int32_t result)
 {
     uint8_t* const out = fake::guarded(size, 0xA5);
-    EXPECT_EQ(without_heap([&] { return query(out); }), result);
+    EXPECT_EQ(without_heap_or_log([&] { return query(out); }), result);
     const fake::Bytes written(out, out + size);
     return written == fake::Bytes(size, 0xA5) ? fake::Bytes() : written;
 }

@@ -53,6 +53,7 @@ TEST_F(RequestsConnection, PostAFullMessageEach)
     POSTS(BT_SRV_CON_getTransmittingPower, 0xA0EC, kAddress, kAddress);
     POSTS(BT_SRV_CON_startServiceDiscovery_UUID, 0xA0F3, kAddress + " C1 C2*22 C3", kAddress, "C1 C2*22 C3");
     POSTS(BT_SRV_CON_authenticateNumericValue, 0xA0A2, "00000000" + kAddress, 0, kAddress);
+    POSTS(BT_SRV_CON_authenticateNumericValue, 0xA0A2, "01020000" + kAddress, 0x201, kAddress);
     const std::string key = " 3132333435363738";
     POSTS(BT_SRV_CON_authenticatePasskey, 0xA0A3, "00000000" + kAddress + key, 0, kAddress, key);
     POSTS(BT_SRV_CON_authenticatePasskey, 0xA0A3, "00010000" + kAddress + " 00*8", 0x100, kAddress, kUnreadable);
@@ -61,7 +62,8 @@ TEST_F(RequestsConnection, PostAFullMessageEach)
     POSTS(BT_SRV_CON_authenticatePinCode, 0xA0A1, "00000080" + kAddress + " 00*20", 1u << 31, kAddress, kUnreadable);
     POSTS(BT_SRV_CON_requestAllDisconnection, 0xA087, "00000000" + kAddress, 0, kAddress);
     POSTS(BT_SRV_CON_requestAllDisconnection, 0xA087, "00010000" + kNobody, 0x100, kNobody);
-    POSTS(BT_SRV_CON_acceptConnection, 0xA082, "07000000" + kAddress + " 01000000" + kFilter, 7, kAddress, kFilter);
+    for (const std::string& filter : {kFilter, std::string(" FFFFFF7F A1*32")})
+        POSTS(BT_SRV_CON_acceptConnection, 0xA082, "07000000" + kAddress + " 01000000" + filter, 7, kAddress, filter);
     for (const Given& filter : {Given("00000000 A1*32"), Given("FFFFFFFF A1*32"), Given(nullptr)})
         POSTS(BT_SRV_CON_acceptConnection, 0xA082, "07000000" + kAddress + " 00000000 00*36", 7, kAddress, filter);
 
@@ -158,6 +160,7 @@ TEST_F(RequestsConnection, SenderPostsPreparedMessagesPaddedOrCut)
                 {17, "A1*16 B2", "A1*16 B2 00*1007"},
                 {1024, "A1*1023 B2", "A1*1023 B2"},
                 {1025, "A1*1023 B2", "A1*1023 B2"},
+                {0x10001, "A1*1023 B2", "A1*1023 B2"},
                 {UINT32_MAX, "A1*1023 B2", "A1*1023 B2"}};
     for (const auto& row : rows) {
         fake::reset();

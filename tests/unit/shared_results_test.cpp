@@ -16,7 +16,7 @@
 namespace {
 
 using fake::Bytes;
-using requests::without_heap;
+using requests::without_heap_or_log;
 using SharedResults = requests::RequestRows;
 
 uint8_t* patterned_area(const char* name, uint32_t size)
@@ -45,7 +45,7 @@ void expect_untouched_without_area(const char* area, uint32_t size, uint32_t ask
     SCOPED_TRACE(area);
     fake::reset();
     uint8_t* const out = fake::guarded(20000);
-    const auto call = [&] { return without_heap([&] { return read(out); }); };
+    const auto call = [&] { return without_heap_or_log([&] { return read(out); }); };
     EXPECT_EQ(call(), result) << "not shared";
     fake::null_area(area);
     EXPECT_EQ(call(), result) << "no address";
@@ -70,7 +70,7 @@ Read audio_video_list(int32_t (*read)(uint32_t, uint32_t, list_result*))
     return [=](uint32_t start, uint32_t count, uint8_t* out) {
         list_result* const result = guarded_record<list_result>();
         result->entries = out + 8;
-        const int32_t answer = without_heap([&] { return read(start, count, result); });
+        const int32_t answer = without_heap_or_log([&] { return read(start, count, result); });
         EXPECT_EQ(result->entries, out + 8);
         std::memcpy(out, result, 8);
         return answer;
@@ -82,7 +82,7 @@ Read message_access_list(int32_t (*read)(uint32_t*, void*), int32_t (*read_some)
     return [=](uint32_t, uint32_t maximum, uint8_t* out) {
         uint32_t* const count = guarded_record<uint32_t>();
         const auto call = [&] { return maximum == kAll ? read(count, out + 4) : read_some(maximum, count, out + 4); };
-        const int32_t answer = without_heap(call);
+        const int32_t answer = without_heap_or_log(call);
         std::memcpy(out, count, 4);
         return answer;
     };
@@ -93,7 +93,7 @@ int32_t read_message(uint32_t, uint32_t maximum, uint8_t* out)
     static_assert(offsetof(message_record, body) == (sizeof(void*) == 8 ? 8168 : 8164));
     message_record* const record = guarded_record<message_record>();
     record->body = out + 8164;
-    const int32_t answer = without_heap([&] {
+    const int32_t answer = without_heap_or_log([&] {
         return maximum == kAll ? BT_SRV_MAP_getMessageData(record) : BT_SRV_MAP_getMessageData_ex(maximum, record);
     });
     EXPECT_EQ(record->body, out + 8164) << "the caller's own";
@@ -160,6 +160,7 @@ TEST_F(SharedResults, ListsOfAudioAndVideoAreCopiedAsFarAsTheyGo)
         run(list, cases);
         for (const uint32_t more : {0u, 2 * list.entry_size, 3 * list.entry_size - 1}) // areas that end early
             run(list, {{~0u, 0, 100, 0, more == 0 ? 0u : 2u, 12 + more}});
+        run(list, {{5, 3, 10, 0, 2, list.size, 0}}); // an area whose size is not told
         const auto read = [&](uint8_t* out) { return list.read(0, 10, out); };
         expect_untouched_without_area(list.area, list.size, 0, 12, 0, read);
     }
@@ -182,7 +183,11 @@ TEST_F(SharedResults, ListsOfMessageAccessAreCopiedAsFarAsTheyGo)
                                          {3, 0, 10, 0, 3},         {full, 0, 10, 0, 10},    {more, 0, more, 0, full},
                                          {~0u, 0, ~0u, 0, full},   {~0u, 0, 1, 0, 1},       {3, 0, 0, -1, 0}};
         run(list, cases);
-        run(list, {{~0u, 0, kAll, 0, full, list.size + list.entry_size}}); // an area that is too long
+        // Areas that are too long, without a size, and reported smaller than asked.
+        const uint32_t two_and_a_part = list.entries_at + 3 * list.entry_size - 1;
+        run(list, {{~0u, 0, kAll, 0, full, list.size + list.entry_size},
+                   {~0u, 0, kAll, 0, full, list.size, 0},
+                   {~0u, 0, kAll, 0, 2, list.size, two_and_a_part}});
         for (const uint32_t maximum : {kAll, 1u})
             expect_untouched_without_area(list.area, list.size, list.size, list.entries_at, -1,
                                           [&](uint8_t* out) { return list.read(0, maximum, out); });
@@ -243,6 +248,8 @@ TEST_F(SharedResults, RecordsAreCopiedFromWhereTheyAreNow)
         expect_untouched_without_area(record.area, record.size, record.asked, record.size, -1, record.read);
         const uint8_t* const at = patterned_area(record.area, record.size) + record.offset;
         EXPECT_EQ(requests::output_of(record.length, record.read, 0), Bytes(at, at + record.length));
+        fake::report_size(record.area, 0); // not told
+        EXPECT_EQ(requests::output_of(record.length, record.read, 0), Bytes(at, at + record.length));
         const size_t calls = fake::calls().size();
         EXPECT_EQ(record.read(nullptr), -1);
         EXPECT_EQ(fake::calls().size(), calls);
@@ -292,7 +299,7 @@ TEST_F(SharedResults, PushFillsTheAreaButForTheUnusedGroups)
         put_word(&expected[8148], static_cast<uint32_t>(reinterpret_cast<uintptr_t>(area) + 8152));
         std::fill_n(expected.begin() + 8152, row.stored, uint8_t{0xB0});
         EXPECT_EQ(BT_SRV_MAP_setPushMessageData(pushed(nullptr, 1)), -1);
-        EXPECT_EQ(without_heap([&] { return BT_SRV_MAP_setPushMessageData(record); }), 0);
+        EXPECT_EQ(without_heap_or_log([&] { return BT_SRV_MAP_setPushMessageData(record); }), 0);
         EXPECT_TRUE(Bytes(area, area + row.size) == expected);
         EXPECT_THAT(fake::sizes_asked(), testing::ElementsAre(9652u));
         EXPECT_EQ(BT_SRV_MAP_setPushMessageData(pushed(nullptr, 0)), 0);
@@ -315,12 +322,17 @@ TEST_F(SharedResults, InstancesAreCopiedWithTheirNames)
 {
     const char* const name = "/tmp/shm_map_insinfo";
     const uint8_t lengths[] = {64, 0, 1, 63, 65, 255, 128, 2, 3, 4, 5, 6};
-    for (const uint32_t stored : {0u, 1u, 12u, 13u, 255u}) {
-        SCOPED_TRACE(stored);
+    const struct {
+        uint8_t stored, copied;
+        uint32_t reported;
+    } rows[] = {{0, 0, 940}, {1, 1, 940}, {12, 12, 940}, {13, 12, 940}, {255, 12, 0}, {12, 11, 915}};
+    for (const auto& [stored, copied, reported] : rows) {
+        SCOPED_TRACE(testing::Message() << +stored << " in " << reported);
         fake::reset();
         uint8_t* const area = patterned_area(name, 940);
-        area[0] = static_cast<uint8_t>(stored);
-        Bytes expected(1, static_cast<uint8_t>(std::min(stored, 12u)));
+        fake::report_size(name, reported);
+        area[0] = stored;
+        Bytes expected(1, copied);
         expected.resize(1u + 67u * expected[0], 0xA5);
         for (size_t i = 0; i < 12; ++i)
             area[4 + 76 * i + 9] = lengths[i];
@@ -333,7 +345,7 @@ TEST_F(SharedResults, InstancesAreCopiedWithTheirNames)
             instance[66] = entry[74];
         }
         uint8_t* const out = fake::guarded(static_cast<uint32_t>(expected.size()));
-        EXPECT_EQ(without_heap([&] { return read_instances(out); }), 0);
+        EXPECT_EQ(without_heap_or_log([&] { return read_instances(out); }), 0);
         EXPECT_TRUE(Bytes(out, out + expected.size()) == expected);
     }
     expect_untouched_without_area(name, 940, 940, 4, -1, read_instances);

@@ -74,13 +74,17 @@ TEST_F(SystemDebug, EnableWritesOneLineForEachFlagThatIsOne)
 
 TEST_F(SystemDebug, FilesChangeAlsoWhenThePostFails)
 {
+    std::string at_post; // what the service finds
+    fake::at_send([&] { at_post = switches(); });
     fake::answer_send(-1);
     EXPECT_EQ(BT_SRV_requestDebugEnable(nullptr), -1);
     EXPECT_EQ(switches(), kOld + "|" + kOld + "|") << "a refused call changes nothing";
     EXPECT_EQ(BT_SRV_requestDebugEnable(Given("00000000*3 01000000*2 00000000*4")), -127);
     EXPECT_EQ(switches(), "@StrmLog=ON;\n|@AirLog=ON;\n|");
+    EXPECT_EQ(at_post, "@StrmLog=ON;\n|@AirLog=ON;\n|");
     EXPECT_EQ(BT_SRV_requestDebugDisable(), -127);
     EXPECT_EQ(switches(), "none|none|");
+    EXPECT_EQ(at_post, "none|none|");
 }
 
 TEST_F(SystemDebug, ExportCopiesWhatFitsThePathAndRemovesTheSwitches)
@@ -122,13 +126,14 @@ TEST_F(SystemDebug, ExportCopiesEveryByteAndSkipsMissingLogs)
     EXPECT_EQ(BT_SRV_requestDebugOutput((fake::root() + "/export").c_str()), 0);
     EXPECT_TRUE(contents({"/export/bt_cmn.log"}) == log + "|");
     EXPECT_EQ(contents({"/export/bt_stk.log", "/export/osapi.log"}), "stays||");
+    write("/tmp/bt_stk.log/in/the/way", ""); // from now on one that opens and cannot be read
 
     EXPECT_EQ(BT_SRV_requestDebugOutput((fake::root() + "/tmp").c_str()), 0);
     EXPECT_TRUE(contents({"/tmp/bt_cmn.log"}) == log + "|") << "in its place already";
 
     write("/export/new/bt_cmn.log/in/the/way", ""); // one destination that cannot be opened
     EXPECT_EQ(BT_SRV_requestDebugOutput((fake::root() + "/export/new").c_str()), 0);
-    EXPECT_EQ(contents({"/export/new/osapi.log"}), "|");
+    EXPECT_EQ(contents({"/export/new/bt_stk.log", "/export/new/osapi.log"}), "||");
 }
 
 TEST_F(SystemDebug, ExportToNowhereChangesNothing)
