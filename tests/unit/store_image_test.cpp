@@ -113,7 +113,7 @@ TEST(StoreImage, WriteRewritesTheFileInPlace)
 {
     const Bytes image = image_of(sample_data());
     attached_process(sample_data());
-    for (const size_t longer : {3, 0}) {
+    for (const size_t longer : {3u, 0u}) {
         fake::write_file(kImagePath, Bytes(longer == 0 ? 0 : kImageSize + longer, 0x77));
         EXPECT_EQ(bt_con_writeFROM(), 0);
         expect_left(sample_data(), image + Bytes(longer, 0x77));
