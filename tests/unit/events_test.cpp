@@ -103,6 +103,7 @@ TEST_F(Events, CountsAndNullsAtTheirLimits)
     fake::report_size(kTable, 8004);
     std::memset(table_, 0, 4);
     EXPECT_EQ(add(), 0u) << "not initialised";
+    EXPECT_EQ((fake::null_area(kTable), add()), 0u) << "linked, but nowhere";
 }
 
 TEST_F(Events, FiftyListenersFit)
@@ -179,6 +180,8 @@ TEST_F(Events, DispatchPostsHeaderAndPayloadUnderTheLock)
     EXPECT_EQ(fake::posts()[0].pno, 0xFF02u);
     EXPECT_EQ(fake::posts()[0].message.size(), 28u);
     EXPECT_EQ(Lines(fake::calls().end() - 3, fake::calls().end()), (Lines{"SemLock", "SndMsg", "SemUnlock"}));
+    EXPECT_EQ(logged("CMN", [&] { BT_EDS_dispatch(123, &message); })[0],
+              "[API][START] BT_CMN_sendMsgWrapper BT_EDS_dispatch\n");
 }
 
 TEST_F(Events, DispatchSideLogsEveryFailure)

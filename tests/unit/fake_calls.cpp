@@ -63,10 +63,10 @@ int32_t _sys_SndMsg(uint32_t pno, uint32_t size, const void* message, uint32_t z
     return call.s.send_answer;
 }
 
-int32_t _sys_RcvMsg(uint32_t own_pno, uint32_t size, void* buffer, uint32_t)
+int32_t _sys_RcvMsg(uint32_t own_pno, uint32_t size, void* buffer, uint32_t zero)
 {
     Call call;
-    if (call.fails("RcvMsg", joined({own_pno, size}))) return -1;
+    if (call.fails("RcvMsg", joined({own_pno, size, zero}))) return -1;
     if (call.s.incoming.empty()) return call.s.receive_answer;
     const Bytes message = call.s.incoming.front();
     call.s.incoming.pop_front();

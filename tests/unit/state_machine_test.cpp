@@ -25,7 +25,7 @@ BtStateRow state(uint32_t number, const BtStateRow* parent)
 }
 
 // R holds P and Q; A, B are in P; C is in Q; S and T stand alone.
-enum : uint32_t { kA = 1, kB, kC, kP, kQ, kR, kS, kT, kUnknown = 0x99 };
+enum : uint32_t { kA = 1, kB, kC, kP, kQ, kR, kS, kT = 0x1FFFF, kUnknown = 0x99 };
 const BtStateRow kEnd = {0xFFFF, nullptr, nullptr, nullptr};
 const BtStateRow kTop = state<'R'>(kR, nullptr), kOfP = state<'P'>(kP, &kTop), kOfQ = state<'Q'>(kQ, &kTop);
 const BtStateRow kStates[] = {state<'A'>(kA, &kOfP),
@@ -84,7 +84,7 @@ TEST(StateChange, LogsEachStep)
     const auto expect = [](uint32_t* current, uint32_t next, const BtStateRow* table, const Lines& lines) {
         EXPECT_EQ(logged("CMN", [&] { BT_CMN_changeStatus(current, next, table); }), lines);
     };
-    uint32_t a = kA, s = kS, unknown = kUnknown;
+    uint32_t a = kA, s = kS, t = kT, unknown = kUnknown;
     expect(nullptr, kB, kStates,
            {start, place + "param err. current_state = (nil), state_table = " + pointer_text(kStates), end + "(1)"});
     expect(&a, kB, nullptr,
@@ -93,6 +93,7 @@ TEST(StateChange, LogsEachStep)
     expect(&a, kB, &kEnd, {start, place + "param err. current_state = 0x0001, tmp_state = 0xffff", place + "ret = 1"});
     expect(&unknown, kB, kStates,
            {start, place + "param err. current_state = 0x0099, tmp_state = 0xffff", place + "ret = 1"});
+    expect(&t, kUnknown, kStates, {start, end + "(1)"});
     expect(
         &s, kP, kStates,
         {start, "[API][MODEL] bt_cmn_changeStatusExit",
@@ -101,6 +102,8 @@ TEST(StateChange, LogsEachStep)
          "[API][MODEL] bt_cmn_changeStatusEntry", "[model:bt_cmn_changeStatusEntry] done state( 0006 ) entry func. ",
          "[API][MODEL] bt_cmn_changeStatusEntry ", "[model:bt_cmn_changeStatusEntry] done state( 0004 ) entry func. ",
          "[API][MODEL] bt_cmn_changeStatusEntry ", end + "(0)"});
+    EXPECT_EQ(logged("CMN", [] { bt_cmn_changeStatusExit(&kOfP); })[2],
+              "[model:bt_cmn_changeStatusExit] state( 0004 ) has parent state. ");
     EXPECT_EQ(logged("CMN", [] { bt_cmn_changeStatusExit(nullptr); }),
               (Lines{"[API][MODEL] bt_cmn_changeStatusExit",
                      "[model:bt_cmn_changeStatusExit] param err. state_table = (nil) ",
@@ -135,9 +138,10 @@ const BtMatrixRow kFirstMatrix[] = {
 const BtMatrixRow kSecondMatrix[] = {{2, 0x11, action<5, 9>}, {2, 0x16, action<6, 0>}, {0xFFFF, 0, nullptr}};
 const BtFunctionIdRow kMachines[] = {
     {1, current<1>, kFirstMatrix}, {2, current<2>, kSecondMatrix},        {3, nullptr, kFirstMatrix},
-    {4, current<1>, nullptr},      {5, BT_CMN_nopGetState, kFirstMatrix}, {0xFFFF, nullptr, nullptr}};
-const BtDispatchRow kDispatch[] = {{0x10, 1}, {0x11, 1}, {0x11, 2}, {0x12, 1}, {0x13, 1}, {0x14, 1},  {0x15, 9},
-                                   {0x16, 2}, {0x16, 1}, {0x17, 3}, {0x18, 4}, {0x19, 5}, {0xFFFF, 0}};
+    {4, current<1>, nullptr},      {5, BT_CMN_nopGetState, kFirstMatrix}, {1, current<2>, nullptr},
+    {0xFFFF, nullptr, nullptr}};
+const BtDispatchRow kDispatch[] = {{0x10, 1}, {0x11, 1}, {0x11, 2}, {0x12, 1}, {0x13, 1}, {0x14, 1},
+                                   {0x15, 9}, {0x16, 2}, {0x16, 1}, {0x17, 3}, {0x19, 5}, {0xFFFF, 0}};
 
 BtMessage message_with(uint16_t cid)
 {
@@ -162,7 +166,6 @@ TEST(EventHandling, FindsTheActionOfEveryMachineThatWantsTheEvent)
         {0x15, 1, {}, "[API][tmp_func_id] 9 "}, // no such machine
         {0x16, 1, {6}, "[API][tmp_func_id] 2 "}, // handled by the first machine, unknown to the last
         {0x17, 1, {}, "[model:bt_cmn_searchFuncIdTable] param err. getstate = (nil) "},
-        {0x18, 1, {}, "[model:bt_cmn_searchMtxTable] param err. mtx_table = (nil) "},
         {0x19, 1, {}, "When EVENT recieved , current_state is 65535 "}, // a machine that handles nothing
         {0xFFFF, 1, {}, "[API][START] bt_cmn_searchDispatchTable"}, // the end row is not a row
     };
@@ -213,6 +216,8 @@ TEST(EventHandling, NullArgumentsAreRefusedAtEveryLevel)
             "[API][MODEL] bt_cmn_searchMtxTable ", [] { return bt_cmn_searchMtxTable(nullptr, kMachines, 1); });
     refused("model", "bt_cmn_searchMtxTable", "data = " + data + ", func_id_table = (nil) ",
             "[API][MODEL] bt_cmn_searchMtxTable ", [&] { return bt_cmn_searchMtxTable(&message, nullptr, 1); });
+    refused("model", "bt_cmn_searchMtxTable", "mtx_table = (nil) ", "[API][MODEL] bt_cmn_searchMtxTable ",
+            [&] { return bt_cmn_searchMtxTable(&message, &kMachines[3], 1); });
     refused("api", "BT_CMN_nopMtxFunc", "data = (nil) ", "[API][END] BT_CMN_nopMtxFunc (1)",
             [] { return BT_CMN_nopMtxFunc(nullptr); });
     refused("api", "BT_CMN_errMtxFunc", "data = (nil) ", "[API][END] BT_CMN_errMtxFunc (1)",

@@ -4,6 +4,7 @@
 #include <bt_service/bt_message.h>
 #include <bt_service/bt_transport.h>
 #include <gmock/gmock.h>
+#include <unistd.h>
 
 #include <cstring>
 
@@ -87,8 +88,10 @@ TEST_F(TransportDeathTest, MinusOneEndsTheProcessAndNullIsRefused)
     fake::answer_send(-1);
     fake::answer_receive(-1);
     const testing::ExitedWithCode minus_one(255);
-    EXPECT_EXIT(BT_CMN_sendMsgWrapper("f", "g", 1, 2, &message), minus_one, "ended");
-    EXPECT_EXIT(BT_CMN_recvMsgWrapper("f", "g", 1, &message), minus_one, "ended");
+    BT_CMN_logout_wrapperFunc = _BT_CMN_logout_Console;
+    EXPECT_EXIT((dup2(2, 1), BT_CMN_sendMsgWrapper("f", "g", 1, 2, &message)), minus_one, "getPno=2\nthe library");
+    EXPECT_EXIT((dup2(2, 1), BT_CMN_recvMsgWrapper("f", "g", 1, &message)), minus_one, "getPno=8c2\nthe library");
+    BT_CMN_logout_wrapperFunc = _BT_CMN_logout_Stub;
 
     EXPECT_EQ(logged("CMN", [] { EXPECT_EQ(BT_CMN_sendMsgWrapper("f", "g", 1, 2, nullptr), 1); }),
               (Lines{"[API][START] BT_CMN_sendMsgWrapper g\n", "[api:BT_CMN_sendMsgWrapper] param err. data = (nil) ",
@@ -114,7 +117,7 @@ TEST_F(Transport, ReceiveTakesTheOwnNumbersMessage)
     DebugSRVOutLogSts = DebugConsoleLogSts = 1;
     fake::incoming(sent);
     EXPECT_EQ(outputs_of([&] { receive(0); }).console, "BTSRV A091 00010203\n");
-    EXPECT_EQ(fake::calls()[0], "RcvMsg(2242,1024)");
+    EXPECT_EQ(fake::calls()[0], "RcvMsg(2242,1024,0)");
     for (const int32_t answer : {0, 2, -2}) {
         fake::answer_receive(answer);
         EXPECT_THAT(
@@ -177,8 +180,8 @@ TEST_F(Transport, TraceGoesToEveryOutputThatIsOn)
 
 TEST(RequestResponseTable, LooksUpByEitherColumn)
 {
-    const BtResponseRow table[] = {
-        {0x10, 0x110, 4}, {0x11, 0x111, 8}, {0x10, 0x112, 9}, {0x13, 0x111, 7}, {0xFFFF, 0xFFFF, 1}};
+    const BtResponseRow table[] = {{0x10, 0x110, 4},   {0x11, 0x111, 8},  {0x10, 0x112, 9}, {0x13, 0x111, 7},
+                                   {0xFFFF, 0x120, 6}, {0x14, 0xFFFF, 5}, {0x15, 0x121, 3}, {0xFFFF, 0xFFFF, 1}};
     std::vector<BtResponseRow> endless(300, {1, 1, 1});
     endless[255] = {2, 2, 22};
     endless[256] = {3, 3, 33};
@@ -192,6 +195,8 @@ TEST(RequestResponseTable, LooksUpByEitherColumn)
     } rows[] = {{table, 0x10, 0, 0x110, 4, 1, 7},     {table, 0x111, 1, 7, 7, 0, 8},
                 {table, 0x112, 1, 7, 7, 0, 9},        {table, 0xFFFF, 1, 7, 7, 1, 7},
                 {table, 0x10010, 1, 7, 7, 1, 7},      {table, 0x10111, 1, 7, 7, 1, 7},
+                {table, 0x120, 1, 7, 7, 0, 6},        {table, 0x15, 1, 7, 7, 1, 7}, // each column has its end
+                {table + 5, 0x15, 0, 0x121, 3, 1, 7}, {table + 5, 0x121, 1, 7, 7, 1, 7},
                 {endless.data(), 2, 0, 2, 22, 0, 22}, {endless.data(), 3, 1, 7, 7, 1, 7}};
     for (const auto& row : rows) {
         SCOPED_TRACE(row.id);
