@@ -2,10 +2,12 @@
 
 #include <gtest/gtest.h>
 #include <sys/mman.h>
+#include <sys/resource.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
 #include <algorithm>
+#include <csignal>
 #include <cstring>
 #include <filesystem>
 #include <fstream>
@@ -180,6 +182,18 @@ bool in_child(const std::function<void()>& body)
     }
     int status = 0;
     return child > 0 && waitpid(child, &status, 0) == child && WIFEXITED(status) && WEXITSTATUS(status) == 0;
+}
+
+void with_longest_file(size_t bytes, const std::function<void()>& body)
+{
+    rlimit usual{};
+    getrlimit(RLIMIT_FSIZE, &usual);
+    const rlimit tight = {bytes, usual.rlim_max};
+    const auto handler = signal(SIGXFSZ, SIG_IGN);
+    setrlimit(RLIMIT_FSIZE, &tight);
+    body();
+    setrlimit(RLIMIT_FSIZE, &usual);
+    signal(SIGXFSZ, handler);
 }
 
 const std::string& root()

@@ -81,6 +81,9 @@ uint32_t lock_handle(const std::string& name); // 0 when never created
 // state is that of this process at the call, so a test that needs untouched state calls it before touching any.
 bool in_child(const std::function<void()>& body);
 
+// Runs `body` where no file can grow beyond that size; what tries to gets an error, not a signal.
+void with_longest_file(size_t bytes, const std::function<void()>& body);
+
 // Root below which the library opens its files (BT_SERVICE_ROOT of the test program), a folder of this process alone.
 const std::string& root();
 void write_file(const std::string& unit_path, const Bytes& content); // creates folders

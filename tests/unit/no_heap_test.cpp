@@ -1,5 +1,6 @@
 // The library lives without the heap: only a queue's second and further events are allocated. The rows of requests and
 // of results watch the heap too.
+#include "log_capture.h"
 #include "request_rows.h"
 
 #include <bt_service/bt_service.h>
@@ -17,6 +18,7 @@
 
 static thread_local bool counting = false;
 static thread_local uint32_t heap_calls = 0;
+static thread_local bool no_memory = false; // for a queue's event
 
 uint32_t requests::heap_calls_of(const std::function<void()>& body)
 {
@@ -43,7 +45,7 @@ void __libc_free(void* memory);
 void* malloc(size_t size) noexcept
 {
     count();
-    return __libc_malloc(size);
+    return no_memory && size == sizeof(BtQueueNode) ? nullptr : __libc_malloc(size);
 }
 void* calloc(size_t number, size_t size) noexcept
 {
@@ -125,6 +127,11 @@ TEST(NoHeap, QueueAllocatesOneNodeAnEventBeyondTheFirst)
     const auto take = [] { BT_CMN_queueMsg(&taken, &queue); };
     for (const uint32_t calls : {0u, 1u, 1u})
         EXPECT_EQ(heap_calls_of(add), calls);
+    no_memory = true;
+    EXPECT_EQ(logged("CMN", add),
+              (Lines{"[API][START] BT_CMN_enqueueMsg", "[api:BT_CMN_enqueueMsg] malloc err. ( event cnt = 3 ) ",
+                     "[API][END] BT_CMN_enqueueMsg (1)"}));
+    no_memory = false;
     for (const uint32_t calls : {1u, 1u, 0u, 0u})
         EXPECT_EQ(heap_calls_of(take), calls);
     EXPECT_EQ(queue.link, &queue);

@@ -2,11 +2,9 @@
 #include "store_support.h"
 
 #include <fcntl.h>
-#include <sys/resource.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
-#include <csignal>
 #include <cstring>
 
 using namespace store;
@@ -118,16 +116,7 @@ TEST(StoreImage, WriteRewritesTheFileInPlace)
         EXPECT_EQ(bt_con_writeFROM(), 0);
         expect_left(sample_data(), image + Bytes(longer, 0x77));
     }
-    rlimit usual{}, tight{};
-    ASSERT_EQ(getrlimit(RLIMIT_FSIZE, &usual), 0);
-    tight = usual;
-    tight.rlim_cur = kImageSize - 1;
-    const auto handler = signal(SIGXFSZ, SIG_IGN);
-    ASSERT_EQ(setrlimit(RLIMIT_FSIZE, &tight), 0);
-    const int32_t short_write = bt_con_writeFROM();
-    setrlimit(RLIMIT_FSIZE, &usual);
-    signal(SIGXFSZ, handler);
-    EXPECT_EQ(short_write, -1);
+    fake::with_longest_file(kImageSize - 1, [] { EXPECT_EQ(bt_con_writeFROM(), -1); });
 
     EXPECT_EQ(bt_con_initFROM(), 0);
     expect_left(default_data(), image_of(default_data()));
