@@ -18,7 +18,6 @@
 
 static thread_local bool counting = false;
 static thread_local uint32_t heap_calls = 0;
-static thread_local bool no_memory = false; // for a queue's event
 
 uint32_t requests::heap_calls_of(const std::function<void()>& body)
 {
@@ -30,6 +29,8 @@ uint32_t requests::heap_calls_of(const std::function<void()>& body)
 }
 
 #if defined(__GLIBC__) && !defined(BT_SANITIZER_HAS_THE_HEAP)
+
+static thread_local bool no_memory = false; // for a queue's event
 
 static void count()
 {
