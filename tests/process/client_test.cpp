@@ -158,6 +158,13 @@ TEST_F(ClientUnit, DevicesAreTheRegisteredOnesAndTheirNamesLeaveJsonValidAndTerm
     EXPECT_THAT(text, testing::AllOf(testing::Not(HasSubstr("\x1B")), HasSubstr("\\x1b[31m\\xff\\xc3\"\\x0a")));
 }
 
+TEST_F(ClientUnit, FirstProgramOfTheReadmeConnectsAPhoneAndListsIt)
+{
+    const Ended done = Program("env BT_PLATFORM_DOMAIN=" + unit.domain + " '" FIRST_PROGRAM_PATH "'").end();
+    EXPECT_EQ(done.code, 0) << done.err;
+    EXPECT_EQ(done.out, "answer 0xA881, result 0\ndevice 0: Anna's phone\n");
+}
+
 TEST_F(ClientUnit, ListenerPrintsItsEventsAndLeavesTheTableWhenItIsToldToEnd)
 {
     const std::tuple<const char*, int, int> rows[] = {{"CON_SEARCH CON_CONNECTED", SIGTERM, 0},
