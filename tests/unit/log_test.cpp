@@ -12,6 +12,7 @@ namespace {
 using fake::Bytes;
 using testing::ElementsAre;
 
+const char* const kMain = "/fs/rwdata/BT/btstack/BT_SERVICE_DEBUG";
 const char* const kFallback = "/fs/sd0/BT_SERVICE_DEBUG";
 
 void write_switches(const char* path, const std::string& switches)
@@ -60,7 +61,7 @@ protected:
     // The flags for console, file, trace and stream that the switches select.
     static std::string select(const std::string& switches)
     {
-        write_switches("/fs/rwdata/BT/btstack/BT_SERVICE_DEBUG", switches);
+        write_switches(kMain, switches);
         BT_CMN_DebugLogSelecter();
         return {static_cast<char>('0' + DebugConsoleLogSts), static_cast<char>('0' + DebugFileOutLogSts),
                 static_cast<char>('0' + DebugSRVOutLogSts), static_cast<char>('0' + DebugStrmLogStsOn)};
@@ -107,6 +108,24 @@ TEST_F(Log, SwitchFileLinesSelectTheFlags)
     };
     for (const auto& [content, expected] : rows)
         EXPECT_EQ(select(content), expected) << content;
+}
+
+// A process reads its root once, so this comes before all others.
+using LogDeathTest = Log;
+
+TEST_F(LogDeathTest, PathsBeginWithTheRootIfAnyAndAreNeverCut)
+{
+    write_switches(kMain, "");
+    std::string too_long = fake::root();
+    while (too_long.size() < 768)
+        too_long += "/.";
+    const std::pair<std::string, size_t> rows[] = {{fake::root(), 1}, {too_long, 2}, {"", 2}}; // none found: two errors
+    for (const auto& [root, lines] : rows)
+        EXPECT_TRUE(fake::in_child([root = root, lines = lines] {
+            root.empty() ? unsetenv("BT_SERVICE_ROOT") : setenv("BT_SERVICE_ROOT", root.c_str(), 1);
+            BT_CMN_DebugLogSelecter();
+            EXPECT_EQ(zel(1).size(), lines);
+        })) << root;
 }
 
 TEST_F(Log, FallbackFileIsReadOnlyWhenTheFirstCannotBeOpened)
@@ -164,6 +183,7 @@ TEST_F(Log, RecordsEndInOneNewlineUnlessTheFormatHasIt)
                 {cmn, "%s\n", "plain", "[CMN] plain\n", "[CMN] plain\n"},
                 {cmn, "%s", "ends\n", "[CMN] ends\n\n", "[CMN] ends\n\n"},
                 {cmn, "", "", "[CMN] \n", "[CMN] \n"},
+                {cmn, "\n", "", "[CMN] \n", "[CMN] \n"},
                 {tag.c_str(), "%s", "7", "[" + tag.substr(0, 127) + "] 7\n", "[" + tag + "] 7\n"},
                 {none, "%s", "x", "", ""},
                 {cmn, none, "x", "", ""}};
