@@ -26,8 +26,8 @@ protected:
 
 TEST_F(PlatformTimers, ExpireInTheOrderOfTheirLatestTimesUnlessStopped)
 {
-    const std::pair<uint32_t, uint32_t> starts[] = {{1, UINT32_MAX}, {0x12345678, 60}, {2, 30}, {3, 0},
-                                                    {4, 30},         {5, 20},          {6, 10}, {6, 70}};
+    const std::pair<uint32_t, uint32_t> starts[] = {{1, UINT32_MAX}, {0x12345678, 600}, {2, 300}, {3, 0},
+                                                    {4, 300},        {5, 1000000},      {6, 250}, {6, 700}};
     for (const auto& [id, ms] : starts)
         ASSERT_EQ(start(id, ms), 0);
     EXPECT_EQ(stop(5), 0);
